@@ -1,0 +1,80 @@
+# One helper per module kind. Each subsystem declares its static library here
+# with the libraries it depends on; every library and test comes in two
+# variants: the plain one and a "_san" one built with AddressSanitizer and
+# UndefinedBehaviorSanitizer, so that one ctest run covers both.
+
+set(ARCHWAY_WARNINGS -Wall -Wextra -Werror)
+set(ARCHWAY_SAN_FLAGS -fsanitize=address,undefined -fno-sanitize-recover=all
+    -fno-omit-frame-pointer)
+
+# archway_library(NAME <name> DIRS <dir>... [DEPENDS <our libs>...]
+#                 [SYSTEM <imported targets or flags>...])
+# Sources are all .cpp files below the given folders.
+function(archway_library)
+  cmake_parse_arguments(A "" "NAME" "DIRS;DEPENDS;SYSTEM" ${ARGN})
+  set(sources)
+  foreach(dir ${A_DIRS})
+    file(GLOB_RECURSE found CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/${dir}/*.cpp)
+    list(APPEND sources ${found})
+  endforeach()
+  foreach(variant "" "_san")
+    if(variant STREQUAL "_san" AND NOT ARCHWAY_SANITIZE)
+      continue()
+    endif()
+    set(target ${A_NAME}${variant})
+    add_library(${target} STATIC ${sources})
+    target_include_directories(${target} PUBLIC ${PROJECT_SOURCE_DIR})
+    target_compile_options(${target} PRIVATE ${ARCHWAY_WARNINGS})
+    set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON
+                                               CXX_VISIBILITY_PRESET hidden
+                                               VISIBILITY_INLINES_HIDDEN ON)
+    foreach(dep ${A_DEPENDS})
+      target_link_libraries(${target} PUBLIC ${dep}${variant})
+    endforeach()
+    target_link_libraries(${target} PUBLIC ${A_SYSTEM})
+    if(variant STREQUAL "_san")
+      target_compile_options(${target} PUBLIC ${ARCHWAY_SAN_FLAGS})
+      target_link_options(${target} PUBLIC ${ARCHWAY_SAN_FLAGS})
+    endif()
+  endforeach()
+endfunction()
+
+# archway_test(NAME <name> DIRS <dir>... LIBS <our libs>... [SYSTEM ...])
+# One GoogleTest program per test folder, registered with CTest; the
+# sanitizer variant's cases carry the prefix "san.".
+function(archway_test)
+  cmake_parse_arguments(A "" "NAME" "DIRS;LIBS;SYSTEM" ${ARGN})
+  set(sources)
+  foreach(dir ${A_DIRS})
+    file(GLOB_RECURSE found CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/${dir}/*.cpp)
+    list(APPEND sources ${found})
+  endforeach()
+  if(NOT sources)
+    return()
+  endif()
+  foreach(variant "" "_san")
+    if(variant STREQUAL "_san" AND NOT ARCHWAY_SANITIZE)
+      continue()
+    endif()
+    set(target ${A_NAME}_tests${variant})
+    add_executable(${target} ${sources})
+    target_compile_options(${target} PRIVATE ${ARCHWAY_WARNINGS})
+    target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
+    foreach(lib ${A_LIBS})
+      target_link_libraries(${target} PRIVATE ${lib}${variant})
+    endforeach()
+    target_link_libraries(${target} PRIVATE ${A_SYSTEM} GTest::gtest GTest::gmock
+                                            GTest::gtest_main)
+    target_compile_definitions(${target} PRIVATE
+        ARCHWAY_TEST_DATA_DIR="${PROJECT_SOURCE_DIR}/tests/data")
+    if(variant STREQUAL "_san")
+      set(prefix "san.")
+    else()
+      set(prefix "")
+    endif()
+    gtest_discover_tests(${target} TEST_PREFIX "${prefix}${A_NAME}."
+                         DISCOVERY_TIMEOUT 60
+                         PROPERTIES ENVIRONMENT
+                         "ASAN_OPTIONS=detect_leaks=1:abort_on_error=1;UBSAN_OPTIONS=print_stacktrace=1")
+  endforeach()
+endfunction()
