@@ -6,6 +6,7 @@ packages=(
   g++ cmake ninja-build pkg-config make
   googletest libgtest-dev libgmock-dev libbenchmark-dev
   clang-format
+  libtiff-dev libpng-dev libjpeg-dev
 )
 
 missing=()
