@@ -5,7 +5,7 @@ set -euo pipefail
 packages=(
   g++ cmake ninja-build pkg-config make
   googletest libgtest-dev libgmock-dev libbenchmark-dev
-  clang-format
+  clang-format g++-multilib
   libtiff-dev libpng-dev libjpeg-dev
 )
 
