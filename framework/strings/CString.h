@@ -28,8 +28,15 @@ class CString {
   long ShareCount() const { return text_.use_count(); }
 
   // In place: a keyed string becomes its text; any other string is left alone.
+  // The text comes from the string table, else from the current
+  // CStringSource (unless it prefers defaults), else from the default after
+  // "=" with its escapes parsed; the answer is then kept in the table, so the
+  // source is asked once per key. "$$$/key" without "=" defaults to empty and
+  // an empty key gives an empty text.
   void Resolve();
-  // In place: C escapes and caret sequences become the characters they name.
+  // In place: C escapes (\" \\ \n \r \t) and caret sequences (^n, ^C,
+  // ^+hhhh, ...) become the characters they name; "^0", "^1", ... stay, for
+  // Replace. The bytes are shared still when nothing changed.
   void ParseEscapes();
   // The resolved text with the first "^index" replaced by value.
   CString Replace(int index, const CString& value) const;
