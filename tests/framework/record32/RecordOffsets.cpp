@@ -4,6 +4,7 @@
 #include <cstddef>
 
 #include "framework/plugin/HostFilterRecord.h"
+#include "framework/plugin/HostSuites.h"
 
 namespace {
 
@@ -63,5 +64,29 @@ static_assert(offsetof(C, imageHeight) == 4 && offsetof(C, imageWidth) == 8);
 static_assert(offsetof(C, filterRect) == 12 && offsetof(C, inRect) == 28);
 static_assert(offsetof(C, outRect) == 44 && offsetof(C, maskRect) == 60);
 static_assert(offsetof(C, floatOrigin) == 76 && offsetof(C, wholeSize) == 84);
+
+using Tarsa::HostAlphaChannel;
+using Tarsa::HostChannelNode;
+using Tarsa::HostDocumentInfo;
+using Tarsa::HostScriptBlock;
+static_assert(offsetof(HostDocumentInfo, version) == 4);
+static_assert(offsetof(HostDocumentInfo, targetCompositeChannels) == 808);
+static_assert(offsetof(HostDocumentInfo, targetTransparency) == 812);
+static_assert(offsetof(HostDocumentInfo, targetMask) == 816);
+static_assert(offsetof(HostDocumentInfo, layerMaskChannels) == 820);
+static_assert(offsetof(HostDocumentInfo, layerTransparency) == 824);
+static_assert(offsetof(HostDocumentInfo, mergedCompositeChannels) == 828);
+static_assert(offsetof(HostDocumentInfo, alphaChannels) == 840);
+static_assert(offsetof(HostDocumentInfo, mergedMask) == 872);
+static_assert(offsetof(HostChannelNode, next) == 8 && offsetof(HostChannelNode, port) == 12);
+static_assert(offsetof(HostChannelNode, bounds) == 16 && offsetof(HostChannelNode, readable) == 52);
+static_assert(offsetof(HostAlphaChannel, next) == 8 && offsetof(HostAlphaChannel, channel) == 12);
+static_assert(offsetof(HostAlphaChannel, transparency) == 16);
+static_assert(offsetof(HostScriptBlock, playMode) == 2 &&
+              offsetof(HostScriptBlock, descriptor) == 8);
+static_assert(offsetof(Tarsa::HostPropertyProcs, getProperty) == 4);
+static_assert(offsetof(Tarsa::HostChannelPortsSuite, readPixelsFromLevel) == 36);
+static_assert(offsetof(Tarsa::HostDescriptorSuite, putEnumerated) == 17 * 4);
+static_assert(offsetof(Tarsa::HostDescriptorSuite, getData) == 45 * 4);
 
 }  // namespace
