@@ -1,0 +1,74 @@
+#include "framework/process/CReporter.h"
+
+#include <exception>
+#include <iostream>
+#include <utility>
+
+namespace Tarsa {
+
+namespace {
+
+constexpr const char* kDefaultText =
+    "$$$/Tarsa/Reporter/Default=The operation could not be completed.";
+constexpr const char* kTitle = "$$$/Tarsa/Reporter/Title=Error";
+
+// Stands in for the alert window until the window layer brings one.
+class CConsolePresenter : public CAlertPresenter {
+ public:
+  void ShowAlert(const CString& title, const CString& text) override {
+    std::cerr << title.Str() << ": " << text.Str() << std::endl;
+  }
+  void Beep() override { std::cerr << '\a' << std::flush; }
+};
+
+std::unique_ptr<CAlertPresenter>& Presenter() {
+  static auto* presenter = new std::unique_ptr<CAlertPresenter>(new CConsolePresenter);
+  return *presenter;
+}
+
+}  // namespace
+
+CString CReporter::AlertText(const CException& exception) {
+  CString text = ResolveText(exception.ErrorText());
+  if (text.IsEmpty()) text = ResolveText(exception.TaskText());
+  if (text.IsEmpty()) text = ResolveText(kDefaultText);
+  return text;
+}
+
+CString CReporter::AlertTitle() { return ResolveText(kTitle); }
+
+void CReporter::Report(const CException& exception) {
+  if (exception.IsSilent()) return;
+  try {
+    if (exception.IsAlertable()) {
+      Presenter()->ShowAlert(AlertTitle(), AlertText(exception));
+    } else {
+      Presenter()->Beep();
+    }
+  } catch (...) {
+    // Nothing is left to tell the user with; the failure was already
+    // handled where it was caught.
+  }
+}
+
+void CReporter::ReportCurrent() {
+  if (!std::current_exception()) return;
+  try {
+    throw;
+  } catch (const CException& e) {
+    Report(e);
+  } catch (const std::exception&) {
+    Report(CError(""));
+  } catch (...) {
+    Report(CException());
+  }
+}
+
+std::unique_ptr<CAlertPresenter> CReporter::SetPresenter(
+    std::unique_ptr<CAlertPresenter> presenter) {
+  if (presenter == nullptr) presenter = std::make_unique<CConsolePresenter>();
+  std::swap(Presenter(), presenter);
+  return presenter;
+}
+
+}  // namespace Tarsa

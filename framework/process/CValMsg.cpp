@@ -1,0 +1,8 @@
+#include "framework/process/CValMsg.h"
+
+namespace Tarsa {
+
+template class CValMsg<std::uint32_t>;
+template class CValMsg<CObjID>;
+
+}  // namespace Tarsa
