@@ -1,0 +1,138 @@
+#include "framework/files/CVolEntry.h"
+
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <cstdint>
+#include <filesystem>
+
+#include "framework/core/CException.h"
+#include "framework/files/CDirectory.h"
+#include "framework/files/CFile.h"
+#include "framework/files/FilePaths.h"
+#include "tests/framework/files/FilesTestSupport.h"
+
+namespace Tarsa {
+namespace {
+
+namespace fs = std::filesystem;
+using testing::Bytes;
+using testing::SystemCode;
+
+TEST(CFile, ConstructorsNameOnlyFilesAndMakeThemOnRequest) {
+  testing::TempFolder folder;
+  fs::create_directory(folder.Path("sub"));
+  folder.WriteBytes("there.txt", {1});
+  const CDirectory dir(folder.Dir());
+
+  EXPECT_EQ(SystemCode([&] { CFile f(folder.Path("sub")); }), 2);
+  EXPECT_EQ(SystemCode([&] { CFile f(folder.Path("absent.txt")); }), 2);
+  EXPECT_EQ(SystemCode([&] { CFile f(dir, "absent.txt", false); }), 2);
+  EXPECT_FALSE(fs::exists(folder.Path("absent.txt")));
+  EXPECT_EQ(SystemCode([&] { CFile f(dir, "sub", true); }), 2);
+
+  const CFile made(dir, "made.txt", true);
+  EXPECT_TRUE(fs::is_regular_file(made.GetPath()));
+  EXPECT_EQ(fs::file_size(made.GetPath()), 0u);
+  EXPECT_TRUE(made.Exists());
+  // Making is no truncation: an existing file keeps its bytes.
+  EXPECT_EQ(CFile(dir, "there.txt", true).GetPath(), folder.Path("there.txt"));
+  EXPECT_EQ(folder.ReadBytes("there.txt"), (Bytes{1}));
+
+  // A keyed path resolves to its text before the disk is asked.
+  const CFile keyed("$$$/Test/Path=" + folder.Path("there.txt"));
+  EXPECT_EQ(keyed.GetPath(), folder.Path("there.txt"));
+}
+
+TEST(CDirectory, ConstructorNamesOnlyDirectoriesAndMakesThemOnRequest) {
+  testing::TempFolder folder;
+  folder.WriteBytes("file", {7});
+  EXPECT_EQ(SystemCode([&] { CDirectory d(folder.Path("file")); }), 267);
+  EXPECT_EQ(SystemCode([&] { CDirectory d(folder.Path("file"), true); }), 267);
+  EXPECT_EQ(folder.ReadBytes("file"), (Bytes{7}));
+  EXPECT_EQ(SystemCode([&] { CDirectory d(folder.Path("absent")); }), 267);
+  EXPECT_FALSE(fs::exists(folder.Path("absent")));
+
+  const CDirectory made(folder.Path("made"), true);
+  EXPECT_EQ(made.GetPath(), folder.Path("made/"));
+  EXPECT_TRUE(fs::is_directory(made.GetPath()));
+  EXPECT_TRUE(made.Exists());
+  EXPECT_FALSE(CDirectory::FromPath(folder.Path("file")).Exists());
+  EXPECT_FALSE(CFile::FromPath(folder.Path("made")).Exists());
+}
+
+TEST(CDirectory, DeleteGoesDepthFirstAndLeavesLinkTargets) {
+  testing::TempFolder folder;
+  fs::create_directories(folder.Path("tree/a/b/c"));
+  fs::create_directories(folder.Path("outside"));
+  folder.WriteBytes("outside/keep.txt", {1});
+  folder.WriteBytes("tree/top.txt", {1});
+  folder.WriteBytes("tree/a/b/c/deep.txt", {1});
+  folder.WriteBytes("tree/a/b/mid.txt", {1});
+  fs::create_directory_symlink(folder.Path("outside"), folder.Path("tree/a/link"));
+
+  CDirectory(folder.Path("tree")).Delete();
+  EXPECT_FALSE(fs::exists(folder.Path("tree")));
+  EXPECT_TRUE(fs::exists(folder.Path("outside/keep.txt")));
+
+  CVolEntry file(folder.Path("outside/keep.txt"));
+  file.Delete();
+  EXPECT_FALSE(fs::exists(folder.Path("outside/keep.txt")));
+  EXPECT_EQ(SystemCode([&] { file.Delete(); }), ENOENT);
+}
+
+TEST(FilePaths, ChildrenAndPathsAreMadeOnRequestOnly) {
+  testing::TempFolder folder;
+  const CDirectory dir(folder.Dir());
+  folder.WriteBytes("plain", {});
+
+  CDirectory child;
+  EXPECT_FALSE(GetChildDirectory(dir, "kid", child, false));
+  EXPECT_FALSE(fs::exists(folder.Path("kid")));
+  EXPECT_TRUE(GetChildDirectory(dir, "kid", child, true));
+  EXPECT_EQ(child.GetPath(), folder.Path("kid/"));
+  EXPECT_FALSE(GetChildDirectory(dir, "plain", child, true));
+
+  CFile file;
+  EXPECT_FALSE(GetChildFile(dir, "kid", file, true));
+  EXPECT_TRUE(GetChildFile(dir, "new.txt", file, true));
+  EXPECT_TRUE(fs::is_regular_file(folder.Path("new.txt")));
+
+  CDirectory deep;
+  EXPECT_FALSE(GetDirectoryFromPath(folder.Path("p/q/r/"), deep, false));
+  EXPECT_FALSE(fs::exists(folder.Path("p")));
+  EXPECT_TRUE(GetDirectoryFromPath(folder.Path("p/q/r/"), deep, true));
+  EXPECT_TRUE(fs::is_directory(folder.Path("p/q/r")));
+  EXPECT_FALSE(GetDirectoryFromPath(folder.Path("plain/x/"), deep, true));
+
+  CFile deepFile;
+  EXPECT_TRUE(GetFileFromPath(folder.Path("m/n/f.txt"), deepFile, true));
+  EXPECT_EQ(deepFile.GetPath(), folder.Path("m/n/f.txt"));
+  EXPECT_TRUE(fs::is_regular_file(folder.Path("m/n/f.txt")));
+  EXPECT_FALSE(GetFileFromPath(folder.Path("p/q"), deepFile, true));
+  EXPECT_FALSE(GetFileFromPath(folder.Path("none.txt"), deepFile, false));
+}
+
+TEST(CVolEntry, KindsAndTimesComeFromTheDisk) {
+  testing::TempFolder folder;
+  folder.WriteBytes("f.txt", {1, 2});
+  const CVolEntry file(folder.Path("f.txt"));
+  const CVolEntry dir(folder.Dir());
+  const CVolEntry missing(folder.Path("none"));
+  EXPECT_TRUE(file.Exists() && file.IsFile() && !file.IsDirectory());
+  EXPECT_TRUE(dir.Exists() && !dir.IsFile() && dir.IsDirectory());
+  EXPECT_FALSE(missing.Exists() || missing.IsFile() || missing.IsDirectory());
+
+  // A whole second, which every file system stores exactly.
+  const auto stamp = std::chrono::sys_seconds(std::chrono::seconds(1577836800));
+  fs::last_write_time(file.GetPath(), std::chrono::file_clock::from_sys(stamp));
+  EXPECT_EQ(file.GetWriteTime(), 1577836800ull * 1000000000ull);
+  EXPECT_GT(file.GetCreationTime(), 0u);
+
+  std::uint64_t created = 1, accessed = 1, written = 1;
+  EXPECT_FALSE(missing.GetTimes(created, accessed, written));
+  EXPECT_EQ(created + accessed + written, 0u);
+}
+
+}  // namespace
+}  // namespace Tarsa
