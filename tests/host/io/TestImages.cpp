@@ -1,0 +1,92 @@
+#include "tests/host/io/TestImages.h"
+
+#include <stdlib.h>
+
+#include <algorithm>
+#include <cmath>
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <set>
+#include <sstream>
+#include <stdexcept>
+
+namespace Host::Testing {
+
+ScratchFolder::ScratchFolder() {
+  std::string pattern = std::filesystem::temp_directory_path() / "archway_host_io_XXXXXX";
+  if (mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
+  path_ = pattern;
+}
+
+ScratchFolder::~ScratchFolder() {
+  std::error_code ignored;
+  std::filesystem::remove_all(path_, ignored);
+}
+
+std::string ScratchFolder::Listing() const {
+  std::set<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(path_)) {
+    names.insert(entry.path().filename().string());
+  }
+  std::string listing;
+  for (const std::string& name : names) listing += name + "\n";
+  return listing;
+}
+
+std::unique_ptr<HostDocument> RandomDocument(int32_t width, int32_t height, ImageMode mode,
+                                             bool transparency, uint32_t seed) {
+  auto document = HostDocument::Create(width, height, mode, transparency);
+  std::mt19937 random(seed);
+  std::uniform_int_distribution<int> sample(0, document->MaxSample());
+  for (int p = 0; p < document->PlaneCount(); ++p) {
+    for (int32_t i = 0; i < width * height; ++i)
+      document->SetSample(p, i % width, i / width, sample(random));
+  }
+  return document;
+}
+
+std::unique_ptr<HostDocument> PhotoLikeDocument(int32_t width, int32_t height, ImageMode mode,
+                                                uint32_t seed) {
+  auto document = HostDocument::Create(width, height, mode);
+  std::mt19937 random(seed);
+  std::uniform_int_distribution<int> noise(-3, 3);
+  for (int p = 0; p < document->PlaneCount(); ++p) {
+    for (int32_t y = 0; y < height; ++y) {
+      for (int32_t x = 0; x < width; ++x) {
+        const double wave = 0.5 + 0.4 * std::sin(0.05 * x + 1.3 * p) * std::cos(0.07 * y - p);
+        document->SetSample(p, x, y,
+                            static_cast<int>(wave * document->MaxSample()) + noise(random));
+      }
+    }
+  }
+  return document;
+}
+
+int LargestDifference(const HostDocument& a, const HostDocument& b) {
+  if (a.Width() != b.Width() || a.Height() != b.Height() || a.Mode() != b.Mode() ||
+      a.PlaneCount() != b.PlaneCount()) {
+    return -1;
+  }
+  int largest = 0;
+  for (int p = 0; p < a.PlaneCount(); ++p) {
+    for (int32_t i = 0; i < a.Width() * a.Height(); ++i) {
+      const int32_t x = i % a.Width();
+      const int32_t y = i / a.Width();
+      largest = std::max(largest, std::abs(a.Sample(p, x, y) - b.Sample(p, x, y)));
+    }
+  }
+  return largest;
+}
+
+std::string ReadBytes(const std::string& path) {
+  std::ostringstream bytes;
+  bytes << std::ifstream(path, std::ios::binary).rdbuf();
+  return bytes.str();
+}
+
+void WriteBytes(const std::string& path, const std::string& bytes) {
+  std::ofstream(path, std::ios::binary | std::ios::trunc) << bytes;
+}
+
+}  // namespace Host::Testing
