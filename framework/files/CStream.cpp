@@ -3,6 +3,7 @@
 #include <bit>
 #include <utility>
 
+#include "framework/core/CException.h"
 #include "framework/files/CContainer.h"
 #include "framework/files/CMemoryContainer.h"
 
@@ -58,6 +59,12 @@ float CStream::ReadFloat() { return std::bit_cast<float>(ReadU32()); }
 double CStream::ReadDouble() { return std::bit_cast<double>(ReadU64()); }
 bool CStream::ReadBool() { return ReadByte() != 0; }
 
+std::string CStream::ReadPascalString() {
+  std::string text(ReadByte(), '\0');
+  if (!text.empty()) Read(text.data(), text.size());
+  return text;
+}
+
 void CStream::WriteByte(std::uint8_t value) { Write(&value, 1); }
 
 void CStream::WriteU16(std::uint16_t value) {
@@ -80,6 +87,12 @@ void CStream::WriteI32(std::int32_t value) { WriteU32(static_cast<std::uint32_t>
 void CStream::WriteFloat(float value) { WriteU32(std::bit_cast<std::uint32_t>(value)); }
 void CStream::WriteDouble(double value) { WriteU64(std::bit_cast<std::uint64_t>(value)); }
 void CStream::WriteBool(bool value) { WriteByte(value ? 1 : 0); }
+
+void CStream::WritePascalString(std::string_view text) {
+  if (text.size() > 255) throw CError(kStringTooLongText);
+  WriteByte(static_cast<std::uint8_t>(text.size()));
+  if (!text.empty()) Write(text.data(), text.size());
+}
 
 void CStream::ReadInto(CMemoryContainer& container, std::uint32_t count) {
   // A damaged length field must fail before it allocates, not after.

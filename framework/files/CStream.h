@@ -3,6 +3,8 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
+#include <string>
+#include <string_view>
 #include <type_traits>
 
 namespace Tarsa {
@@ -16,6 +18,9 @@ class CMemoryContainer;
 // stream owns nothing but its byte-order switch.
 class CStream {
  public:
+  static constexpr const char* kStringTooLongText =
+      "$$$/Tarsa/Stream/Error/StringTooLong=A length-prefixed string is longer than 255 bytes.";
+
   CStream() = default;
   virtual ~CStream() = default;
 
@@ -43,6 +48,8 @@ class CStream {
   double ReadDouble();
   // One byte; anything but 0 is true.
   bool ReadBool();
+  // A length byte, then that many 8-bit characters, taken as they are.
+  std::string ReadPascalString();
 
   void WriteByte(std::uint8_t value);
   void WriteU16(std::uint16_t value);
@@ -54,6 +61,9 @@ class CStream {
   void WriteDouble(double value);
   // One byte, 1 or 0.
   void WriteBool(bool value);
+  // A length byte, then the characters; no terminator, no padding. A string
+  // longer than 255 bytes is refused, with nothing written, rather than cut.
+  void WritePascalString(std::string_view text);
 
   // A plain record whose first field is a u32: only that field follows the
   // byte order; the rest travels as it lies in memory.

@@ -4,7 +4,8 @@
 #include <utility>
 
 #include "framework/core/CException.h"
-#include "framework/resource/CByteReader.h"
+#include "framework/files/CConstContainer.h"
+#include "framework/resource/ResourceStreams.h"
 
 namespace Tarsa {
 namespace {
@@ -15,28 +16,30 @@ constexpr const char* kDamagedText =
 }  // namespace
 
 CPropertyList::CPropertyList(std::span<const std::uint8_t> bytes) {
-  CByteReader reader(bytes, kDamagedText);
-  if (reader.ReadU16() != kVersion) {
-    throw CError(
-        "$$$/Tarsa/PropertyList/Error/Version=The plug-in property list has a version "
-        "this host does not read.");
-  }
-  reader.ReadU32();
-  const std::uint32_t count = reader.ReadU32();
-  // Each property takes at least 16 bytes: a bound before reserving.
-  if (count > reader.Remaining() / 16) reader.Fail();
-  properties_.reserve(count);
-  for (std::uint32_t i = 0; i < count; ++i) {
-    Property property;
-    property.vendor = reader.ReadU32();
-    property.key = reader.ReadU32();
-    property.id = reader.ReadU32();
-    const std::uint32_t length = reader.ReadU32();
-    const auto value = reader.ReadBytes(length);
-    property.value.assign(value.begin(), value.end());
-    reader.Skip((4 - length % 4) % 4);
-    properties_.push_back(std::move(property));
-  }
+  ReadOrDamaged(kDamagedText, [&] {
+    CConstContainer in(bytes);
+    if (in.ReadU16() != kVersion) {
+      throw CError(
+          "$$$/Tarsa/PropertyList/Error/Version=The plug-in property list has a version "
+          "this host does not read.");
+    }
+    in.ReadU32();
+    const std::uint32_t count = in.ReadU32();
+    // Each property takes at least 16 bytes: a bound before reserving.
+    if (count > (in.Size() - in.Position()) / 16) throw CError(kDamagedText);
+    properties_.reserve(count);
+    for (std::uint32_t i = 0; i < count; ++i) {
+      Property property;
+      property.vendor = in.ReadU32();
+      property.key = in.ReadU32();
+      property.id = in.ReadU32();
+      const std::uint32_t length = in.ReadU32();
+      const auto value = in.ReadView(length);
+      property.value.assign(value.begin(), value.end());
+      in.SkipRead((4 - length % 4) % 4);
+      properties_.push_back(std::move(property));
+    }
+  });
 }
 
 const CPropertyList::Property* CPropertyList::Find(std::uint32_t key) const {

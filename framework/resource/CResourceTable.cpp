@@ -5,8 +5,9 @@
 #include <utility>
 
 #include "framework/core/CException.h"
-#include "framework/resource/CByteReader.h"
+#include "framework/files/CConstContainer.h"
 #include "framework/resource/FourCharCode.h"
+#include "framework/resource/ResourceStreams.h"
 
 namespace Tarsa {
 namespace {
@@ -15,11 +16,13 @@ constexpr const char* kDamagedText =
     "$$$/Tarsa/Resource/Error/Damaged=The resource table is damaged.";
 constexpr std::uint8_t kMagic[4] = {'T', 'R', 'E', 'S'};
 
+[[noreturn]] void Damaged() { throw CError(kDamagedText); }
+
 // The zeros after a name or data of `size` bytes; anything else there means
 // the blob is not what it claims.
-void SkipPadding(CByteReader& reader, std::size_t size) {
-  for (const std::uint8_t c : reader.ReadBytes((8 - size % 8) % 8)) {
-    if (c != 0) reader.Fail();
+void SkipPadding(CConstContainer& in, std::size_t size) {
+  for (const std::uint8_t c : in.ReadView((8 - size % 8) % 8)) {
+    if (c != 0) Damaged();
   }
 }
 
@@ -51,46 +54,48 @@ CResourceTable CResourceTable::Adopt(std::vector<std::uint8_t> blob) {
 }
 
 void CResourceTable::Parse(std::span<const std::uint8_t> blob) {
-  CByteReader header(blob, kDamagedText);
-  const auto magic = header.ReadBytes(4);
-  if (!std::equal(magic.begin(), magic.end(), kMagic)) {
-    throw CError("$$$/Tarsa/Resource/Error/NotATable=The bytes are not a resource table.");
-  }
-  if (header.ReadU16() != kVersion) {
-    throw CError(
-        "$$$/Tarsa/Resource/Error/Version=The resource table has a format version this "
-        "program does not read.");
-  }
-  if (header.ReadU16() != 0) header.Fail();
-  const std::uint32_t count = header.ReadU32();
-  const std::uint32_t size = header.ReadU32();
-  if (size < kHeaderSize || size > blob.size() || size % kAlignment != 0) header.Fail();
-  // The smallest entry takes 16 bytes, which bounds the count before any
-  // memory is reserved for it.
-  if (count > (size - kHeaderSize) / kEntryHeaderSize) header.Fail();
-
-  CByteReader reader(blob.first(size), kDamagedText);
-  reader.Skip(kHeaderSize);
   std::vector<Entry> entries;
-  entries.reserve(count);
-  for (std::uint32_t i = 0; i < count; ++i) {
-    Entry entry;
-    entry.type = reader.ReadU32();
-    entry.number = reader.ReadI32();
-    const std::uint32_t nameLength = reader.ReadU32();
-    const std::uint32_t dataSize = reader.ReadU32();
-    if (nameLength > kMaxNameLength || (nameLength != 0 && entry.number != 0)) reader.Fail();
-    const auto name = reader.ReadBytes(nameLength);
-    for (const std::uint8_t c : name) {
-      if (c < 0x20 || c >= 0x7F) reader.Fail();
+  ReadOrDamaged(kDamagedText, [&] {
+    CConstContainer header(blob);
+    const auto magic = header.ReadView(4);
+    if (!std::equal(magic.begin(), magic.end(), kMagic)) {
+      throw CError("$$$/Tarsa/Resource/Error/NotATable=The bytes are not a resource table.");
     }
-    SkipPadding(reader, nameLength);
-    entry.name = std::string_view(reinterpret_cast<const char*>(name.data()), name.size());
-    entry.data = reader.ReadBytes(dataSize);
-    SkipPadding(reader, dataSize);
-    entries.push_back(entry);
-  }
-  if (reader.Remaining() != 0) reader.Fail();
+    if (header.ReadU16() != kVersion) {
+      throw CError(
+          "$$$/Tarsa/Resource/Error/Version=The resource table has a format version this "
+          "program does not read.");
+    }
+    if (header.ReadU16() != 0) Damaged();
+    const std::uint32_t count = header.ReadU32();
+    const std::uint32_t size = header.ReadU32();
+    if (size < kHeaderSize || size > blob.size() || size % kAlignment != 0) Damaged();
+    // The smallest entry takes 16 bytes, which bounds the count before any
+    // memory is reserved for it.
+    if (count > (size - kHeaderSize) / kEntryHeaderSize) Damaged();
+
+    CConstContainer in(blob.first(size));
+    in.SkipRead(kHeaderSize);
+    entries.reserve(count);
+    for (std::uint32_t i = 0; i < count; ++i) {
+      Entry entry;
+      entry.type = in.ReadU32();
+      entry.number = in.ReadI32();
+      const std::uint32_t nameLength = in.ReadU32();
+      const std::uint32_t dataSize = in.ReadU32();
+      if (nameLength > kMaxNameLength || (nameLength != 0 && entry.number != 0)) Damaged();
+      const auto name = in.ReadView(nameLength);
+      for (const std::uint8_t c : name) {
+        if (c < 0x20 || c >= 0x7F) Damaged();
+      }
+      SkipPadding(in, nameLength);
+      entry.name = std::string_view(reinterpret_cast<const char*>(name.data()), name.size());
+      entry.data = in.ReadView(dataSize);
+      SkipPadding(in, dataSize);
+      entries.push_back(entry);
+    }
+    if (in.Position() != in.Size()) Damaged();
+  });
 
   // A type with the same number or name twice: sorted, twins are neighbours.
   std::vector<const Entry*> sorted;

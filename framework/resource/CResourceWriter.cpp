@@ -3,9 +3,10 @@
 #include <limits>
 
 #include "framework/core/CException.h"
-#include "framework/resource/CByteWriter.h"
+#include "framework/files/CMemoryContainer.h"
 #include "framework/resource/CResourceTable.h"
 #include "framework/resource/FourCharCode.h"
+#include "framework/resource/ResourceStreams.h"
 
 namespace Tarsa {
 
@@ -40,30 +41,35 @@ void CResourceWriter::Add(std::uint32_t type, std::string_view name,
 }
 
 std::vector<std::uint8_t> CResourceWriter::Write() const {
-  CByteWriter out;
-  out.WriteText("TRES");
+  const auto padded = [](std::uint64_t size) {
+    return (size + CResourceTable::kAlignment - 1) / CResourceTable::kAlignment *
+           CResourceTable::kAlignment;
+  };
+  CMemoryContainer out;
+  out.Write("TRES", 4);
   out.WriteU16(CResourceTable::kVersion);
   out.WriteU16(0);
   out.WriteU32(static_cast<std::uint32_t>(items_.size()));
+  const std::uint64_t sizeAt = out.Position();
   out.WriteU32(0);  // the size, patched below
   for (const Item& item : items_) {
+    // Checked before the entry is written, so that every size field fits.
+    const std::uint64_t end = out.Position() + CResourceTable::kEntryHeaderSize +
+                              padded(item.name.size()) + padded(item.data.size());
+    if (end > std::numeric_limits<std::uint32_t>::max()) {
+      throw CError("$$$/Tarsa/Resource/Error/TooLarge=The resource table would exceed 4 GiB.");
+    }
     out.WriteU32(item.type);
     out.WriteI32(item.number);
     out.WriteU32(static_cast<std::uint32_t>(item.name.size()));
-    if (item.data.size() > std::numeric_limits<std::uint32_t>::max()) {
-      throw CError("$$$/Tarsa/Resource/Error/TooLarge=The resource table would exceed 4 GiB.");
-    }
     out.WriteU32(static_cast<std::uint32_t>(item.data.size()));
-    out.WriteText(item.name);
-    out.PadTo(CResourceTable::kAlignment);
-    out.WriteBytes(item.data);
-    out.PadTo(CResourceTable::kAlignment);
+    out.Write(item.name.data(), item.name.size());
+    PadTo(out, CResourceTable::kAlignment);
+    out.Write(item.data.data(), item.data.size());
+    PadTo(out, CResourceTable::kAlignment);
   }
-  if (out.Size() > std::numeric_limits<std::uint32_t>::max()) {
-    throw CError("$$$/Tarsa/Resource/Error/TooLarge=The resource table would exceed 4 GiB.");
-  }
-  out.PatchU32(12, static_cast<std::uint32_t>(out.Size()));
-  return out.Release();
+  PatchU32(out, sizeAt, static_cast<std::uint32_t>(out.Size()));
+  return ContentsOf(out);
 }
 
 }  // namespace Tarsa

@@ -3,14 +3,16 @@
 #include <iterator>
 #include <string_view>
 
-#include "framework/resource/CByteWriter.h"
+#include "framework/files/CMemoryContainer.h"
 #include "framework/resource/FourCharCode.h"
+#include "framework/resource/ResourceStreams.h"
 
 namespace Project {
 namespace {
 
-using Tarsa::CByteWriter;
+using Tarsa::CMemoryContainer;
 using Tarsa::FourCharCode;
+using Tarsa::WriteFourChar;
 
 struct Parameter {
   std::string_view name;
@@ -58,52 +60,52 @@ constexpr Enumerator kRegularizers[] = {
 // An enumeration: its id, the count, then per value its name, code and an
 // empty description.
 template <std::size_t N>
-void WriteEnumeration(CByteWriter& out, std::uint32_t id, const Enumerator (&values)[N]) {
-  out.WriteFourChar(id);
+void WriteEnumeration(CMemoryContainer& out, std::uint32_t id, const Enumerator (&values)[N]) {
+  WriteFourChar(out, id);
   out.WriteU16(static_cast<std::uint16_t>(N));
   for (const Enumerator& value : values) {
-    out.WritePascalText(value.name);
-    out.WriteFourChar(value.code);
-    out.WritePascalText("");
+    out.WritePascalString(value.name);
+    WriteFourChar(out, value.code);
+    out.WritePascalString("");
   }
 }
 
 }  // namespace
 
 std::vector<std::uint8_t> BuildTerminology() {
-  CByteWriter out;
+  CMemoryContainer out;
   // Header: format version 1.1 (two bytes), language 0, script 0, one suite.
-  out.WriteU8(1);
-  out.WriteU8(1);
+  out.WriteByte(1);
+  out.WriteByte(1);
   out.WriteU16(0);
   out.WriteU16(0);
   out.WriteU16(1);
 
   // The suite: vendor, name, id, level, version, event count.
-  out.WritePascalText("Orvane");
-  out.WritePascalText("Archway");
-  out.WriteFourChar(kFilterId);
+  out.WritePascalString("Orvane");
+  out.WritePascalString("Archway");
+  WriteFourChar(out, kFilterId);
   out.WriteU16(1);
   out.WriteU16(1);
   out.WriteU16(1);
 
   // The event: the filter itself, taking the image as its direct object.
-  out.WritePascalText("$$$/Archway/AETE/Name=Archway");
-  out.WritePascalText("");
-  out.WriteFourChar(kFilterId);
-  out.WriteFourChar(kFilterId);
-  out.WriteFourChar(FourCharCode("null"));
-  out.WritePascalText("");
+  out.WritePascalString("$$$/Archway/AETE/Name=Archway");
+  out.WritePascalString("");
+  WriteFourChar(out, kFilterId);
+  WriteFourChar(out, kFilterId);
+  WriteFourChar(out, FourCharCode("null"));
+  out.WritePascalString("");
   out.WriteU16(0);
-  out.WriteFourChar(FourCharCode("#ImR"));
-  out.WritePascalText("");
+  WriteFourChar(out, FourCharCode("#ImR"));
+  out.WritePascalString("");
   out.WriteU16(0xB000);
   out.WriteU16(static_cast<std::uint16_t>(std::size(kParameters)));
   for (const Parameter& parameter : kParameters) {
-    out.WritePascalText(parameter.name);
-    out.WriteFourChar(parameter.key);
-    out.WriteFourChar(parameter.type);
-    out.WritePascalText("");
+    out.WritePascalString(parameter.name);
+    WriteFourChar(out, parameter.key);
+    WriteFourChar(out, parameter.type);
+    out.WritePascalString("");
     out.WriteU16(parameter.flags);
   }
 
@@ -113,7 +115,7 @@ std::vector<std::uint8_t> BuildTerminology() {
   out.WriteU16(2);
   WriteEnumeration(out, FourCharCode("prjM"), kProjections);
   WriteEnumeration(out, FourCharCode("regM"), kRegularizers);
-  return out.Release();
+  return Tarsa::ContentsOf(out);
 }
 
 }  // namespace Project

@@ -5,6 +5,7 @@
 #include <bit>
 #include <cstdint>
 #include <random>
+#include <string>
 #include <vector>
 
 #include "framework/core/CException.h"
@@ -156,6 +157,28 @@ TEST(CStream, TruncatedSamplesFailWithEndOfData) {
       EXPECT_TRUE(FailsWith(kEndOfData, [&] { ExpectSample(c); })) << "length " << length;
     }
   }
+}
+
+TEST(CStream, PascalStringsAreALengthByteThenTheCharacters) {
+  CMemoryContainer c;
+  c.WritePascalString("abc");
+  c.WritePascalString("");
+  c.WritePascalString(std::string(255, 'z'));
+  // Too long for its length byte: refused, nothing written.
+  EXPECT_TRUE(
+      FailsWith(CStream::kStringTooLongText, [&] { c.WritePascalString(std::string(256, 'z')); }));
+  ASSERT_EQ(c.Size(), 4u + 1u + 256u);
+  EXPECT_EQ(Bytes(c.Data(), c.Data() + 5), (Bytes{3, 'a', 'b', 'c', 0}));
+  EXPECT_EQ(c.Data()[5], 255);
+
+  c.SetPosition(0);
+  EXPECT_EQ(c.ReadPascalString(), "abc");
+  EXPECT_EQ(c.ReadPascalString(), "");
+  EXPECT_EQ(c.ReadPascalString(), std::string(255, 'z'));
+
+  // A length byte that promises more than is there.
+  Fill(c, {4, 'a', 'b', 'c'});
+  EXPECT_TRUE(FailsWith(kEndOfData, [&] { c.ReadPascalString(); }));
 }
 
 // A reader whose steps and lengths come from the data itself, as a damaged

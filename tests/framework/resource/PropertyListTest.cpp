@@ -93,5 +93,21 @@ TEST(PropertyList, DamagedListsAreRefused) {
   EXPECT_THROW(list.EntryName(), CError);
 }
 
+// Running out anywhere is the list's own "damaged", not the container's
+// end of data.
+TEST(PropertyList, DamageIsReportedInTheListsOwnWords) {
+  const auto bytes = ModulePropertyList();
+  for (const std::size_t size : {std::size_t{1}, std::size_t{12}, bytes.size() - 1}) {
+    try {
+      const CPropertyList list{std::span(bytes).first(size)};
+      ADD_FAILURE() << size << " bytes were accepted";
+    } catch (const CError& error) {
+      EXPECT_EQ(error.ErrorText(),
+                "$$$/Tarsa/PropertyList/Error/Damaged=The plug-in property list is damaged.")
+          << size;
+    }
+  }
+}
+
 }  // namespace
 }  // namespace Tarsa

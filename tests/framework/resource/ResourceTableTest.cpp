@@ -131,6 +131,30 @@ TEST(ResourceTable, DamagedBlobsAreRefused) {
   }
 }
 
+// A blob that runs out is damaged in the table's own words, wherever it runs
+// out; the more specific refusals keep theirs.
+TEST(ResourceTable, DamageIsReportedInTheTablesOwnWords) {
+  CResourceWriter writer;
+  writer.Add(kAbcd, 1, Bytes{1, 2, 3});
+  const Bytes blob = writer.Write();
+  const auto errorOf = [](std::span<const std::uint8_t> bytes) -> std::string {
+    try {
+      CResourceTable::Borrow(bytes);
+    } catch (const CError& error) {
+      return error.ErrorText();
+    }
+    return "accepted";
+  };
+  const std::string damaged = "$$$/Tarsa/Resource/Error/Damaged=The resource table is damaged.";
+  EXPECT_EQ(errorOf(std::span(blob).first(2)), damaged);  // inside the magic
+  Bytes longData = blob;
+  longData[28] = 0x30;  // the data runs past the blob's own size
+  EXPECT_EQ(errorOf(longData), damaged);
+  Bytes version = blob;
+  version[4] = 2;
+  EXPECT_THAT(errorOf(version), ::testing::HasSubstr("/Error/Version="));
+}
+
 TEST(ResourceTable, RandomDamageNeverReadsOutside) {
   CResourceWriter writer;
   writer.Add(kAbcd, 16000, Bytes(37, 0xAA));
