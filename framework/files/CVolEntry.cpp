@@ -125,4 +125,9 @@ void CVolEntry::Delete() {
   }
 }
 
+void CVolEntry::Rename(const std::string& path) {
+  Native::RenameEntry(path_, path);
+  path_ = path;
+}
+
 }  // namespace Tarsa

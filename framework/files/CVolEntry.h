@@ -56,6 +56,9 @@ class CVolEntry {
   // Removes a file, or a directory with all it holds. A symbolic link is
   // removed itself, never what it points to.
   virtual void Delete();
+  // Moves the entry to `path` on the same volume, replacing a file there at
+  // once; this entry then names the new path.
+  void Rename(const std::string& path);
 
  protected:
   std::string path_;

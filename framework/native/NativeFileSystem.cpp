@@ -8,6 +8,7 @@
 #include <sys/types.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <cstdio>
 
 #include <cerrno>
 #include <cstdlib>
@@ -160,6 +161,10 @@ void RemoveFile(const std::string& path) {
 
 void RemoveDirectory(const std::string& path) {
   if (rmdir(path.c_str()) != 0) ThrowErrno();
+}
+
+void RenameEntry(const std::string& from, const std::string& to) {
+  if (rename(from.c_str(), to.c_str()) != 0) ThrowErrno();
 }
 
 std::vector<std::string> ListDirectory(const std::string& path) {

@@ -49,6 +49,9 @@ void CreateFile(const std::string& path);
 void MakeDirectory(const std::string& path);
 void RemoveFile(const std::string& path);
 void RemoveDirectory(const std::string& path);
+// Moves an entry to a new path on the same volume, replacing a file there in
+// one step: readers see the old file or the new one, never a part.
+void RenameEntry(const std::string& from, const std::string& to);
 // Entry names of a directory, without "." and "..", in the system's order.
 std::vector<std::string> ListDirectory(const std::string& path);
 

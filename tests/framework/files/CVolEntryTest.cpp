@@ -44,6 +44,20 @@ TEST(CFile, ConstructorsNameOnlyFilesAndMakeThemOnRequest) {
   EXPECT_EQ(keyed.GetPath(), folder.Path("there.txt"));
 }
 
+TEST(CFile, RenameReplacesTheTargetWhole) {
+  testing::TempFolder folder;
+  folder.WriteBytes("new.tmp", {7, 8});
+  folder.WriteBytes("prefs", {1, 2, 3});
+  CFile side(folder.Path("new.tmp"));
+  side.Rename(folder.Path("prefs"));
+  EXPECT_EQ(side.GetPath(), folder.Path("prefs"));
+  EXPECT_EQ(folder.ReadBytes("prefs"), (Bytes{7, 8}));
+  EXPECT_FALSE(fs::exists(folder.Path("new.tmp")));
+  // A rename into a missing folder fails with the system's code and moves nothing.
+  EXPECT_NE(SystemCode([&] { side.Rename(folder.Path("missing/prefs")); }), 0);
+  EXPECT_EQ(side.GetPath(), folder.Path("prefs"));
+}
+
 TEST(CDirectory, ConstructorNamesOnlyDirectoriesAndMakesThemOnRequest) {
   testing::TempFolder folder;
   folder.WriteBytes("file", {7});
