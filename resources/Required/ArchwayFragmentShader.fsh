@@ -1,0 +1,62 @@
+#version 120
+
+// Resamples texture unit 0 for the fixed pipeline's texture coordinate 0.
+//
+// The texture is bound with GL_NEAREST, so each fetch returns exactly one
+// texel and the interpolation is done here: Catmull-Rom, a bicubic over the
+// 4 x 4 texels around the point, 16 fetches. It interpolates (at a texel's
+// centre the result is that texel), keeps edges sharper than bilinear, and is
+// continuous in value and slope. A B-spline is smoother but blurs, since it
+// does not pass through the samples; its usual 4-fetch form leans on the
+// hardware's bilinear filtering, which GL_NEAREST rules out anyway.
+//
+// Channels are interpolated as they are stored, as GL_LINEAR would, so the
+// result matches the path without this shader. Outside the texture the result
+// is transparent, never a repeat of the edge; fetches the kernel needs beyond
+// the edge take the edge texel, so no dark or transparent fringe runs inside.
+
+uniform sampler2D source;
+uniform vec2 texelSize;    // 1 / width, 1 / height
+uniform vec2 textureSize;  // width, height in texels
+
+vec4 Texel(vec2 index) {
+  vec2 inside = clamp(index, vec2(0.0), textureSize - vec2(1.0));
+  return texture2D(source, (inside + vec2(0.5)) * texelSize);
+}
+
+// Catmull-Rom weights for the texels at -1, 0, 1, 2 from the one below p.
+vec4 Weights(float t) {
+  float t2 = t * t;
+  float t3 = t2 * t;
+  return vec4(-0.5 * t3 + t2 - 0.5 * t,
+              1.5 * t3 - 2.5 * t2 + 1.0,
+              -1.5 * t3 + 2.0 * t2 + 0.5 * t,
+              0.5 * t3 - 0.5 * t2);
+}
+
+void main() {
+  vec2 uv = gl_TexCoord[0].st;
+  if (any(lessThan(uv, vec2(0.0))) || any(greaterThan(uv, vec2(1.0)))) {
+    gl_FragColor = vec4(0.0);
+    return;
+  }
+
+  // Texel centres lie at whole numbers in p.
+  vec2 p = uv * textureSize - vec2(0.5);
+  vec2 base = floor(p);
+  vec2 t = p - base;
+  vec4 wx = Weights(t.x);
+  vec4 wy = Weights(t.y);
+
+  vec4 sum = vec4(0.0);
+  for (int j = 0; j < 4; ++j) {
+    vec4 row = wx.x * Texel(base + vec2(-1.0, float(j) - 1.0)) +
+               wx.y * Texel(base + vec2(0.0, float(j) - 1.0)) +
+               wx.z * Texel(base + vec2(1.0, float(j) - 1.0)) +
+               wx.w * Texel(base + vec2(2.0, float(j) - 1.0));
+    sum += wy[j] * row;
+  }
+  // The kernel's negative lobes overshoot near steps; stay within the
+  // range a colour can have.
+  gl_FragColor = clamp(sum, 0.0, 1.0);
+}
