@@ -115,6 +115,16 @@ struct HostSuiteAccess {
   HostStatus (*release)(const char* name, std::int32_t version);
 };
 
+// --- Complex host properties ---------------------------------------------------
+
+// Properties read through propertyProcs with a complex handle hand over a new
+// handle of the host's that the filter disposes of. Their contents:
+//   'unnm'  the document's title as UTF-16 code units in the host's byte
+//           order, a trailing zero allowed;
+//   'titl'  the same title as 8-bit text in the system's encoding;
+//   'svls'  the scratch volumes: UTF-8 folder paths, each ending in a zero.
+constexpr std::uint32_t kHostSignature = FourCC("QMRK");
+
 // --- The document's channels (read only) -------------------------------------
 
 // A plane of the document. On a 32-bit build: next at 8, port at 12, bounds
@@ -154,7 +164,9 @@ struct HostDocumentInfo {
   HostChannelNode* mergedMask;  // 872
 };
 
-// The record's scriptBlock: play mode at 2, the descriptor handle at 8.
+// The record's scriptBlock: play mode at 2, the descriptor handle at 8. The
+// host owns both the handle it puts there and the one the filter leaves
+// there: the filter replaces the handle and disposes of neither.
 struct HostScriptBlock {
   std::int16_t reserved0;
   std::int16_t playMode;
@@ -204,6 +216,15 @@ struct HostStringSuite {
 struct HostBufferSuite {
   void* (*allocate)(std::uint32_t size, std::uint32_t* actualSize);
   void (*release)(void** block);
+};
+
+// The lens profile service. Entry 1 answers a query block (laid out by the
+// lens matching code); entry 2 is called once, with no arguments, right after
+// the suite is acquired.
+struct HostLensProfilesSuite {
+  void* reserved0;
+  HostStatus (*query)(void* queryBlock);
+  HostStatus (*prepare)();
 };
 
 // The usage counters suite; the filter drops every call when it is absent.

@@ -4,6 +4,8 @@
 #include <iostream>
 #include <utility>
 
+#include "framework/native/NativeDisplay.h"
+
 namespace Tarsa {
 
 namespace {
@@ -12,10 +14,12 @@ constexpr const char* kDefaultText =
     "$$$/Tarsa/Reporter/Default=The operation could not be completed.";
 constexpr const char* kTitle = "$$$/Tarsa/Reporter/Title=Error";
 
-// Stands in for the alert window until the window layer brings one.
+// The system's alert box when there is a display; otherwise the text goes to
+// standard error, so that a scripted run on a server still says why.
 class CConsolePresenter : public CAlertPresenter {
  public:
   void ShowAlert(const CString& title, const CString& text) override {
+    if (Native::ShowAlertBox(title.Str(), text.Str())) return;
     std::cerr << title.Str() << ": " << text.Str() << std::endl;
   }
   void Beep() override { std::cerr << '\a' << std::flush; }
@@ -48,6 +52,18 @@ void CReporter::Report(const CException& exception) {
   } catch (...) {
     // Nothing is left to tell the user with; the failure was already
     // handled where it was caught.
+  }
+}
+
+void CReporter::ShowAlert(const CString& title, const CString& text) {
+  try {
+    CString shownTitle = title;
+    CString shownText = text;
+    shownTitle.Resolve();
+    shownText.Resolve();
+    Presenter()->ShowAlert(shownTitle, shownText);
+  } catch (...) {
+    // As in Report: an alert that cannot be shown is not a new failure.
   }
 }
 

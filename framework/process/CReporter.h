@@ -12,8 +12,9 @@ namespace Tarsa {
 // a deferred event, a selector) the way the exception asks. A silent one
 // shows nothing; an alertable one shows its error text, else its task text,
 // else a default text, in an error alert; any other sounds the beep. The
-// service owns one presenter; the default one writes "title: text" to
-// standard error. Reporting never throws.
+// service owns one presenter; the default one shows the system's alert box,
+// or with no display writes "title: text" to standard error. Reporting never
+// throws.
 class CReporter {
  public:
   CReporter() = delete;
@@ -23,6 +24,10 @@ class CReporter {
   // Framework exceptions go as they are, standard ones as a CError with no
   // texts, anything else as a plain CException.
   static void ReportCurrent();
+
+  // Shows an error alert that comes from no exception (a refusal, a warning):
+  // both keyed strings are resolved first. Never throws.
+  static void ShowAlert(const CString& title, const CString& text);
 
   // The text an alertable exception shows, resolved.
   static CString AlertText(const CException& exception);

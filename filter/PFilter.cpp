@@ -1,0 +1,384 @@
+#include "filter/PFilter.h"
+
+#include <algorithm>
+#include <cmath>
+#include <vector>
+
+#include "filter/params/BehaviorFile.h"
+#include "filter/params/Descriptor.h"
+#include "filter/params/PreferencesDirectory.h"
+#include "framework/core/CException.h"
+#include "framework/files/CDirectory.h"
+#include "framework/native/NativeDisplay.h"
+#include "framework/process/CReporter.h"
+
+namespace Project {
+
+using Tarsa::CReporter;
+using Tarsa::FourCC;
+
+namespace {
+
+PFilter* gPFilter = nullptr;
+
+constexpr std::uint32_t kPropHostVersion = FourCC("vers");
+constexpr std::uint32_t kPropGraphicsProcessor = FourCC("GPUF");
+constexpr std::uint32_t kPropPlayInfo = FourCC("plip");
+
+constexpr std::uint32_t kSupportedHostMajor = 18;
+constexpr std::intptr_t kGraphicsProcessorOn = 0x80;
+
+constexpr const char* kUnsupportedVersionText =
+    "$$$/Archway/Warning/UnsupportedVersion=This feature is not supported by the current version "
+    "of Quillmark.";
+constexpr const char* kGPUUnusedText =
+    "$$$/Archway/Warning/GPUUnusedText=This feature requires graphics processor acceleration. "
+    "Please check the Performance Preferences and verify that 'Use Graphics Processor' is "
+    "enabled.";
+constexpr const char* kGPUUnusedTitle = "$$$/Archway/Warning/GPUUnusedTitle=Archway Error";
+constexpr const char* kNoOpenGLText =
+    "$$$/Archway/Warning/NoOpenGLSupportText=This feature cannot run because this machine does "
+    "not provide required OpenGL support.";
+constexpr const char* kNoOpenGLTitle = "$$$/Archway/Warning/NoOpenGLSupportTitle=Archway Error";
+constexpr const char* kNo16BitText =
+    "$$$/Archway/Warning/NoOpenGLSupportSuchModeText=The version of OpenGL is too low to support "
+    "16-bit per channel image. Please try to update OpenGL driver or convert the image to 8-bit "
+    "per channel in Quillmark.";
+constexpr const char* kNo16BitTitle =
+    "$$$/Archway/Warning/NoOpenGLSupportSuchModeTitle=Archway Error";
+constexpr const char* kInvalidFullSphericalText =
+    "$$$/Archway/Warning/InvalidFullSphericalRatio=The aspect ratio is not 1:2, which is invalid "
+    "for Full Spherical.";
+
+constexpr const char* kSolverMissingText =
+    "$$$/Archway/Error/SolverMissing=This build of Archway cannot solve corrections yet.";
+constexpr const char* kDialogMissingText =
+    "$$$/Archway/Error/DialogMissing=This build of Archway cannot open its workspace yet.";
+
+constexpr std::uint32_t kAllResetKeys =
+    Tarsa::Native::kModifierControl | Tarsa::Native::kModifierAlt | Tarsa::Native::kModifierShift;
+
+// Millimetres across a 35 mm frame's longer side.
+constexpr float kFrameWidth = 36.0f;
+// Focal lengths closer than this are one.
+constexpr float kFocalTolerance = 0.01f;
+// At 16 mm equivalent a lens is as likely a fisheye as a rectilinear one.
+constexpr float kFisheyeLimit = 16.0f;
+
+}  // namespace
+
+PFilter::PFilter() { gPFilter = this; }
+
+PFilter::~PFilter() {
+  if (lensSuite_ != nullptr) ReleaseSuite(Tarsa::kLensProfilesSuite, 2);
+  // The run's objects go before the hub, whose going ends OpenGL.
+  preferences_.reset();
+  settings_.reset();
+  imageHub_.reset();
+  if (gPFilter == this) gPFilter = nullptr;
+}
+
+PFilter* PFilter::Current() { return gPFilter; }
+
+bool PFilter::SplitMemory(std::uint32_t total, std::uint32_t& first, std::uint32_t& second) {
+  first = std::uint32_t(std::floor(0.8 * double(total)));
+  second = total - first;
+  return true;
+}
+
+bool PFilter::DoParameters() {
+  Use32BitCoordinates(true);
+  return true;
+}
+
+bool PFilter::DoPrepareFinish() { return DoParameters(); }
+
+// ---- Objects of a run ---------------------------------------------------------------
+
+std::string PFilter::PreferencesDirectory() const {
+  Tarsa::CDirectory directory;
+  if (!GetPreferencesDirectory(directory)) return {};
+  return directory.GetPath();
+}
+
+PImageHub& PFilter::ImageHub() {
+  if (imageHub_ == nullptr) {
+    imageHub_ =
+        std::make_unique<PImageHub>(ImageRect(), LayerRect(), Depth(), PreferencesDirectory());
+  }
+  return *imageHub_;
+}
+
+PSettings& PFilter::Settings() {
+  if (settings_ == nullptr) {
+    // The hub's image rectangle is the filter's ImageRect(); asked here
+    // directly, so that settings never start OpenGL.
+    settings_ = std::make_unique<PSettings>(
+        std::int32_t(std::min<std::int64_t>(ImageRect().Width(), INT32_MAX)));
+  }
+  return *settings_;
+}
+
+PPreferences& PFilter::Preferences() {
+  if (preferences_ == nullptr) {
+    // Holding all three keys at this moment starts from the defaults.
+    const bool useDefaults = (HeldModifiers() & kAllResetKeys) == kAllResetKeys;
+    preferences_ = std::make_unique<PPreferences>(
+        std::int32_t(std::min<std::int64_t>(ImageRect().Width(), INT32_MAX)));
+    if (!useDefaults) preferences_->Load();
+  }
+  return *preferences_;
+}
+
+// ---- The run -------------------------------------------------------------------------
+
+bool PFilter::DoStart() {
+  rendered_ = 0;
+
+  std::intptr_t hostVersion = 0;
+  if (!GetProperty(kPropHostVersion, hostVersion) ||
+      (std::uint32_t(hostVersion) >> 16) != kSupportedHostMajor) {
+    CReporter::ShowAlert(CReporter::AlertTitle(), kUnsupportedVersionText);
+    return false;
+  }
+
+  std::intptr_t graphics = 0;
+  if (!GetProperty(kPropGraphicsProcessor, graphics) || (graphics & kGraphicsProcessorOn) == 0) {
+    CReporter::ShowAlert(kGPUUnusedTitle, kGPUUnusedText);
+    return false;
+  }
+
+  PImageHub& hub = ImageHub();
+  if (hub.GLStatus() == PImageHub::kGLMissing) {
+    CReporter::ShowAlert(kNoOpenGLTitle, kNoOpenGLText);
+  } else if (hub.GLStatus() == PImageHub::kGLNo16BitPath) {
+    CReporter::ShowAlert(kNo16BitTitle, kNo16BitText);
+  }
+  if (!hub.GLUsable()) return false;
+
+  OpenMetadata();
+  PPreferences& preferences = Preferences();
+  PSettings& settings = Settings();
+  PSettings local(preferences.settings);
+
+  ImageHub();
+  SuspendWatchCursor(true);
+  Use32BitCoordinates(true);
+  FilterRecord()->flagByte94 = 0;
+
+  try {
+    std::intptr_t playInfo = 0;
+    if (GetProperty(kPropPlayInfo, playInfo) && playInfo != 0 && ReadDescriptor(local)) {
+      settings = local;
+      ResolveProjectionModel(PSettings::kModelFisheye, false, false);
+      PrepareSolver();
+      if (IsInteractive()) {
+        LoadBehaviorFile();
+        if (RunDialog()) WriteDescriptor(settings);
+      } else {
+        Solve();
+        if (hub.RenderFinalSilent()) {
+          rendered_ = 1;
+          WriteDescriptor(settings);
+        }
+      }
+    } else if (IsInteractive()) {
+      settings = preferences.settings;
+      ResolveProjectionModel(PSettings::kModelFisheye, true, false);
+      settings.focalLength = FocalFromMetadata(true);
+      LoadBehaviorFile();
+      PrepareSolver();
+      if (RunDialog()) WriteDescriptor(settings);
+    } else {
+      ReadDescriptor(settings);  // a descriptor that cannot be read leaves the defaults
+      ResolveProjectionModel(PSettings::kModelFisheye, false, false);
+      PrepareSolver();
+      Solve();
+      if (hub.RenderFinalSilent()) {
+        rendered_ = 1;
+        WriteDescriptor(settings);
+      }
+    }
+    preferences.settings = settings;
+    preferences.Save();
+  } catch (...) {
+    // A failed run saves nothing and writes no descriptor, but lets go of
+    // what it took.
+    EndRun();
+    throw;
+  }
+  EndRun();
+  return rendered_ != 0;
+}
+
+void PFilter::OpenMetadata() {
+  // The photo's metadata object is made and loaded here, with the XMP
+  // toolkit opened once; both come with the lens support.
+  metadataToolkitOpen_ = 1;
+}
+
+void PFilter::CloseMetadata() { metadataToolkitOpen_ = 0; }
+
+void PFilter::EndRun() {
+  if (lensSuite_ != nullptr) {
+    ReleaseSuite(Tarsa::kLensProfilesSuite, 2);
+    lensSuite_ = nullptr;
+  }
+  CloseMetadata();
+}
+
+void PFilter::PrepareSolver() { throw Tarsa::CError(kSolverMissingText); }
+
+void PFilter::Solve() { throw Tarsa::CError(kSolverMissingText); }
+
+bool PFilter::RunDialog() { throw Tarsa::CError(kDialogMissingText); }
+
+// ---- Descriptor and behavioural file ---------------------------------------------------
+
+bool PFilter::ReadDescriptor(PSettings& target) {
+  const Tarsa::HostFilterRecord* record = FilterRecord();
+  if (record == nullptr || record->scriptBlock == nullptr) return false;
+  const auto* script = static_cast<const Tarsa::HostScriptBlock*>(record->scriptBlock);
+  // The constraint bytes go to the constraint list once there is one.
+  std::vector<std::uint8_t> constraintData;
+  return Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target, constraintData);
+}
+
+void PFilter::WriteDescriptor(const PSettings& source) {
+  Tarsa::HostFilterRecord* record = FilterRecord();
+  if (record == nullptr || record->scriptBlock == nullptr) return;
+  Tarsa::HostHandle handle = Project::WriteDescriptor(DescriptorSuite(), source, {});
+  if (handle != nullptr)
+    static_cast<Tarsa::HostScriptBlock*>(record->scriptBlock)->descriptor = handle;
+}
+
+void PFilter::LoadBehaviorFile() {
+  Tarsa::CDirectory directory;
+  if (GetPreferencesDirectory(directory)) Project::LoadBehaviorFile(Settings(), directory);
+}
+
+// ---- Projection model and focal length -------------------------------------------------
+
+bool PFilter::MatchLensProfile(bool /*warn*/) {
+  if (lensSuite_ == nullptr) {
+    lensSuite_ = static_cast<const Tarsa::HostLensProfilesSuite*>(
+        AcquireSuite(Tarsa::kLensProfilesSuite, 2));
+    if (lensSuite_ == nullptr) return false;
+    if (lensSuite_->prepare == nullptr || lensSuite_->prepare() != 0) {
+      ReleaseSuite(Tarsa::kLensProfilesSuite, 2);
+      lensSuite_ = nullptr;
+      return false;
+    }
+  }
+  // Choosing a profile from the host's candidates comes with the lens
+  // support; until then no profile matches.
+  cropRatio_ = 0;
+  return false;
+}
+
+void PFilter::ResolveProjectionModel(std::int32_t fallback, bool forceAuto, bool warn) {
+  PSettings& settings = Settings();
+  if (forceAuto) settings.projectionModel = PSettings::kModelAuto;
+
+  if (settings.projectionModel == PSettings::kModelFullSpherical) {
+    const Tarsa::CRect image = ImageRect();
+    const double width = double(image.Width());
+    const double height = double(image.Height());
+    if (width <= 0 || std::fabs(width - 2 * height) / width > 0.001) {
+      settings.projectionModel = fallback;
+      if (warn) CReporter::ShowAlert(CReporter::AlertTitle(), kInvalidFullSphericalText);
+    }
+    return;
+  }
+
+  const FocalData metadata = MetadataFocalData();
+  if (metadata.complete) return;
+  if (settings.projectionModel == PSettings::kModelAuto) {
+    if (MatchLensProfile(warn)) return;
+    settings.projectionModel = fallback;
+  }
+  if (forceAuto) {
+    const float equivalent = metadata.focalLength35mm > 0
+                                 ? metadata.focalLength35mm
+                                 : metadata.focalLength * metadata.cropFactor;
+    if (std::fabs(equivalent) < kFocalTolerance) {
+      settings.projectionModel = fallback;
+    } else if (equivalent - kFisheyeLimit > kFocalTolerance) {
+      settings.projectionModel = PSettings::kModelPerspective;
+    } else if (equivalent > kFocalTolerance && kFisheyeLimit - equivalent > kFocalTolerance) {
+      settings.projectionModel = PSettings::kModelFisheye;
+    }
+  }
+  // An open dialog would refresh its model controls and preview here.
+}
+
+float PFilter::FocalFromMetadata(bool initial) {
+  PSettings& settings = Settings();
+  const FocalData metadata = MetadataFocalData();
+  if (metadata.focalLength > 0 && metadata.cropFactor >= 0.1f) {
+    settings.cropFactor = metadata.cropFactor;
+    settings.physicalFocal = metadata.focalLength;
+  } else if (metadata.focalLength35mm > 0) {
+    settings.cropFactor = metadata.cropFactor >= 0.1f ? metadata.cropFactor : 1.0f;
+    settings.physicalFocal = metadata.focalLength35mm / settings.cropFactor;
+  }
+  const float focal = ImageFocal();
+  if (initial) return focal;
+  if (std::fabs(focal - settings.focalLength) > kFocalTolerance) {
+    // With models 1 and 2 the solver re-solves on a new focal length, once
+    // there is a solver.
+    settings.focalLength = focal;
+  }
+  return focal;
+}
+
+std::int64_t PFilter::LargerSide() const {
+  const Tarsa::CRect image = ImageRect();
+  return std::max(image.Width(), image.Height());
+}
+
+float PFilter::ImageFocal() {
+  const PSettings& settings = Settings();
+  return settings.cropFactor * settings.physicalFocal * float(LargerSide()) / kFrameWidth;
+}
+
+float PFilter::PhysicalFromImage() {
+  const PSettings& settings = Settings();
+  const float divisor = float(LargerSide()) * settings.cropFactor;
+  if (divisor <= 0) return 0;
+  return settings.focalLength * kFrameWidth / divisor;
+}
+
+float PFilter::KnownPhysicalFocal() {
+  const FocalData metadata = MetadataFocalData();
+  if (metadata.focalLength > 0 && metadata.cropFactor >= 0.1f) return metadata.focalLength;
+  const float crop = Settings().cropFactor;
+  if (metadata.focalLength35mm > 0 && crop > 0) return metadata.focalLength35mm / crop;
+  return 0;
+}
+
+bool PFilter::PhysicalFocalRange(float& low, float& high) {
+  const Tarsa::CRect image = ImageRect();
+  const float crop = Settings().cropFactor;
+  const float larger = float(LargerSide());
+  const float smaller = float(std::min(image.Width(), image.Height()));
+  low = high = 0;
+  if (larger <= 0 || crop <= 0) return false;
+  low = smaller * 0.1f * kFrameWidth / (crop * larger);
+  high = smaller * 3.0f * kFrameWidth / (crop * larger);
+  if (const float known = KnownPhysicalFocal(); known > 0) {
+    low = std::min(low, known);
+    high = std::max(high, known);
+  }
+  return true;
+}
+
+bool PFilter::ImageFocalRange(float& low, float& high) {
+  if (!PhysicalFocalRange(low, high)) return false;
+  const float scale = Settings().cropFactor * float(LargerSide()) / kFrameWidth;
+  low *= scale;
+  high *= scale;
+  return true;
+}
+
+}  // namespace Project

@@ -1,0 +1,106 @@
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+#include "filter/PImageHub.h"
+#include "filter/params/PPreferences.h"
+#include "filter/params/PSettings.h"
+#include "framework/plugin/CQuillmarkFilter.h"
+
+namespace Project {
+
+// The program: the module's one filter object, alive from the first
+// parameters, prepare or start selector to finish or the first failure. It
+// decides in DoStart whether a run is interactive, scripted or refused, and
+// what goes back to the host. It owns, each made on first use and deleted
+// with it, the image hub (whose making starts OpenGL), the working settings
+// and the preferences; the host's lens profile suite is held for one run.
+// The rest of the program reaches it through Current().
+class PFilter : public Tarsa::CQuillmarkFilter {
+ public:
+  // What the photo's metadata says about its focal length; zero is absent.
+  struct FocalData {
+    float focalLength = 0;      // millimetres
+    float cropFactor = 0;       // sensor crop factor
+    float focalLength35mm = 0;  // 35 mm equivalent, millimetres
+    bool complete = false;      // the image is a panorama with its own focal data
+  };
+
+  PFilter();
+  ~PFilter() override;
+
+  // The module's filter object, or null.
+  static PFilter* Current();
+
+  Tarsa::CString ProcessName() const override { return "$$$/Archway/Process/Name=Archway"; }
+
+  // first: the floor of 80 % of total; second: the rest.
+  bool SplitMemory(std::uint32_t total, std::uint32_t& first, std::uint32_t& second) override;
+  // Switches on 32-bit coordinates.
+  bool DoParameters() override;
+  bool DoPrepareFinish() override;
+  // The run (see the .cpp for its order).
+  bool DoStart() override;
+
+  // The lazily made objects of a run.
+  PImageHub& ImageHub();
+  PSettings& Settings();
+  // Loaded from the preferences directory unless Ctrl, Alt and Shift are
+  // all held at the moment of making.
+  PPreferences& Preferences();
+  bool HasImageHub() const { return imageHub_ != nullptr; }
+  bool HasPreferences() const { return preferences_ != nullptr; }
+  bool Rendered() const { return rendered_ != 0; }
+
+  // Where the filter's files live; empty when it cannot be had.
+  std::string PreferencesDirectory() const;
+
+  // Decides settings' projection model; see the .cpp.
+  void ResolveProjectionModel(std::int32_t fallback, bool forceAuto, bool warn);
+  // Takes the photo's focal length and crop factor into the settings and
+  // answers the focal length in pixels.
+  float FocalFromMetadata(bool initial);
+  // Millimetres to pixels and back, over the larger side of the image.
+  float ImageFocal();
+  float PhysicalFromImage();
+  // The sensible focal lengths in millimetres, widened to take the one the
+  // metadata gives; false when the image or crop factor is empty.
+  bool PhysicalFocalRange(float& low, float& high);
+  // The same as focal lengths in pixels.
+  bool ImageFocalRange(float& low, float& high);
+
+  // The scripting descriptor of the record's script block.
+  bool ReadDescriptor(PSettings& target);
+  void WriteDescriptor(const PSettings& source);
+  // The behavioural parameters file over the settings.
+  void LoadBehaviorFile();
+
+ protected:
+  // The metadata's focal data. The photo's metadata is read with the lens
+  // support; until then every value is absent.
+  virtual FocalData MetadataFocalData() const { return FocalData{}; }
+  // True when a lens profile of the photo was found and put in the settings.
+  virtual bool MatchLensProfile(bool warn);
+
+ private:
+  void OpenMetadata();
+  void CloseMetadata();
+  void EndRun();
+  void PrepareSolver();
+  void Solve();
+  bool RunDialog();
+  float KnownPhysicalFocal();
+  std::int64_t LargerSide() const;
+
+  std::unique_ptr<PImageHub> imageHub_;
+  std::unique_ptr<PSettings> settings_;
+  std::unique_ptr<PPreferences> preferences_;
+  std::uint8_t rendered_ = 0;
+  std::uint8_t metadataToolkitOpen_ = 0;
+  const Tarsa::HostLensProfilesSuite* lensSuite_ = nullptr;
+  float cropRatio_ = 0;
+};
+
+}  // namespace Project

@@ -1,0 +1,55 @@
+#include "framework/native/NativeDisplay.h"
+
+#include <cstdlib>
+
+#include <SDL.h>
+
+namespace Tarsa::Native {
+
+namespace {
+
+bool gVideoStarted = false;
+
+bool NonEmptyEnv(const char* name) {
+  const char* value = std::getenv(name);
+  return value != nullptr && value[0] != '\0';
+}
+
+bool StartVideo() {
+  if (gVideoStarted) return true;
+  if (!HasDisplay()) return false;
+  // The host owns the process: SDL must not take over its Ctrl-C.
+  SDL_SetHint(SDL_HINT_NO_SIGNAL_HANDLERS, "1");
+  if (SDL_InitSubSystem(SDL_INIT_VIDEO) != 0) return false;
+  gVideoStarted = true;
+  return true;
+}
+
+}  // namespace
+
+bool HasDisplay() { return NonEmptyEnv("DISPLAY") || NonEmptyEnv("WAYLAND_DISPLAY"); }
+
+std::uint32_t KeyboardModifiers() {
+  if (!StartVideo()) return 0;
+  SDL_PumpEvents();
+  const SDL_Keymod mod = SDL_GetModState();
+  std::uint32_t held = 0;
+  if ((mod & KMOD_ALT) != 0) held |= kModifierAlt;
+  if ((mod & KMOD_CTRL) != 0) held |= kModifierControl;
+  if ((mod & KMOD_SHIFT) != 0) held |= kModifierShift;
+  return held;
+}
+
+bool ShowAlertBox(const std::string& title, const std::string& text) {
+  if (!HasDisplay()) return false;
+  // Allowed before SDL is started; it opens its own connection.
+  return SDL_ShowSimpleMessageBox(SDL_MESSAGEBOX_ERROR, title.c_str(), text.c_str(), nullptr) == 0;
+}
+
+void ShutdownDisplay() {
+  if (!gVideoStarted) return;
+  SDL_QuitSubSystem(SDL_INIT_VIDEO);
+  gVideoStarted = false;
+}
+
+}  // namespace Tarsa::Native

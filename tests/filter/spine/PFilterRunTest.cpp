@@ -1,0 +1,197 @@
+// The module's entry and the run of PFilter, driven as the host drives them.
+
+#include <algorithm>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "filter/EntryFI.h"
+#include "filter/PFilter.h"
+#include "framework/native/NativeDisplay.h"
+#include "framework/plugin/CFrameworkServices.h"
+#include "tests/filter/spine/SpineFixture.h"
+#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/process/RecordingPresenter.h"
+
+// The leak checker's suppressions for this program: Mesa's EGL keeps a
+// one-time allocation of its driver's start-up for the life of the process.
+// The driver has no frame pointers, so only the slow unwinder reaches the
+// EGL frame that the suppression names.
+extern "C" const char* __lsan_default_suppressions() { return "leak:libEGL_mesa.so\n"; }
+extern "C" const char* __asan_default_options() { return "fast_unwind_on_malloc=0"; }
+
+namespace Project::testing {
+namespace {
+
+using Tarsa::FourCC;
+using Tarsa::ScopedRecorder;
+using Texts = std::vector<std::string>;
+
+constexpr std::intptr_t kHostVersion18 = std::intptr_t(18) << 16;
+
+class FilterRun : public ::testing::Test {
+ protected:
+  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
+  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
+
+  std::int16_t Call(std::int16_t selector) {
+    std::int16_t result = 77;
+    std::intptr_t slot = 0;
+    EntryFI(selector, &host.record, &slot, &result);
+    return result;
+  }
+
+  ScopedConfigHome config;
+  Tarsa::testing::TestHost host;
+};
+
+TEST_F(FilterRun, EntryAnswersOutsideTheTableAndWithoutAnObject) {
+  EXPECT_EQ(Call(-3), 0);
+  EXPECT_EQ(Call(6), 0);
+  EXPECT_EQ(Call(Tarsa::kSelectorContinue), 0);
+  EXPECT_EQ(PFilter::Current(), nullptr);
+  EXPECT_EQ(Call(Tarsa::kSelectorFinish), 0);
+  EXPECT_FALSE(Tarsa::CFrameworkServices::IsStarted());
+
+  EXPECT_EQ(Call(Tarsa::kSelectorParameters), 0);
+  ASSERT_NE(PFilter::Current(), nullptr);
+  EXPECT_EQ(host.coords.enabled, 1u) << "parameters switches on 32-bit coordinates";
+  EXPECT_EQ(Call(Tarsa::kSelectorFinish), 0);
+  EXPECT_EQ(PFilter::Current(), nullptr);
+}
+
+TEST_F(FilterRun, MemoryOfferIsSplitEightyTwenty) {
+  struct Case {
+    std::uint32_t total, first, second;
+  };
+  // By hand: first = floor(0.8 total), second the rest; neither below the
+  // floor min(total / 2, 0x80000), and first + second never above total.
+  const Case cases[] = {
+      {10000000, 8000000, 2000000},
+      {1000000, 500000, 500000},  // second was 200,000, under the floor 500,000
+      {100, 50, 50},
+      {3, 2, 1},
+      {0, 0, 0},
+      {4294967295u, 3435973836u, 858993459u},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.total);
+    // Without the buffer suite the host is told what the filter takes in all.
+    {
+      TestPFilter filter;
+      filter.SetUseBufferSuite(false);
+      host.record.memoryOffer = c.total;
+      ASSERT_EQ(filter.HandlePrepare(&host.record, nullptr), 0);
+      EXPECT_EQ(host.record.memoryOffer, c.first + c.second);
+      EXPECT_EQ(host.record.bufferShare, c.first);
+    }
+    Tarsa::CPluginEntry::TearDown();
+    // With it (the default), the filter's share comes from the host's
+    // buffers and the host keeps the second part.
+    host.record.memoryOffer = c.total;
+    ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
+    EXPECT_EQ(host.record.memoryOffer, c.second);
+    EXPECT_EQ(host.record.bufferShare, 0u);
+    Call(Tarsa::kSelectorFinish);
+  }
+}
+
+TEST_F(FilterRun, WrongHostVersionIsRefusedBeforeAnythingIsTouched) {
+  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
+  host.properties[FourCC("GPUF")] = 0x80;
+  for (std::intptr_t version :
+       {std::intptr_t(17) << 16, std::intptr_t(19) << 16, std::intptr_t(18)}) {
+    host.properties[FourCC("vers")] = version;
+    ScopedRecorder shown;
+    ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
+    EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
+    EXPECT_EQ(shown.texts,
+              Texts{"This feature is not supported by the current version of Quillmark."});
+    EXPECT_EQ(shown.titles, Texts{"Error"});
+    EXPECT_EQ(PFilter::Current(), nullptr) << "a refused start tears the object down";
+  }
+  // A host that does not say its version is refused the same way.
+  host.properties.erase(FourCC("vers"));
+  ScopedRecorder shown;
+  EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
+  EXPECT_EQ(shown.texts.size(), 1u);
+  EXPECT_TRUE(host.propertyWrites.empty()) << "the watch cursor was never touched";
+  EXPECT_FALSE(config.HasPreferencesFile());
+}
+
+TEST_F(FilterRun, GraphicsProcessorSwitchedOffIsRefused) {
+  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
+  host.properties[FourCC("vers")] = kHostVersion18;
+  host.properties[FourCC("GPUF")] = 0x7F;  // every bit but 7
+  ScopedRecorder shown;
+  EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
+  EXPECT_EQ(shown.titles, Texts{"Archway Error"});
+  EXPECT_EQ(shown.texts, Texts{"This feature requires graphics processor acceleration. Please "
+                               "check the Performance Preferences and verify that 'Use Graphics "
+                               "Processor' is enabled."});
+  EXPECT_EQ(PFilter::Current(), nullptr);
+  EXPECT_TRUE(host.propertyWrites.empty());
+  EXPECT_FALSE(config.HasPreferencesFile());
+}
+
+TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
+  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
+  {
+    PPreferences saved(64);
+    saved.settings.physicalFocal = 42;
+    saved.Save();
+  }
+  ASSERT_TRUE(config.HasPreferencesFile());
+  const std::uint32_t ctrl = Tarsa::Native::kModifierControl;
+  const std::uint32_t alt = Tarsa::Native::kModifierAlt;
+  const std::uint32_t shift = Tarsa::Native::kModifierShift;
+  for (std::uint32_t held : {ctrl | alt | shift, ctrl | alt, 0u}) {
+    TestPFilter filter;
+    ASSERT_EQ(filter.HandleParameters(&host.record, nullptr), 0);
+    filter.heldKeys = held;
+    const bool all = held == (ctrl | alt | shift);
+    EXPECT_EQ(filter.Preferences().settings.physicalFocal, all ? 15.0f : 42.0f) << held;
+  }
+}
+
+// The run as far as this build goes: through the host, GPU and OpenGL checks,
+// preferences and settings, to the point where the solver would be prepared,
+// which throws. Needs a working OpenGL environment (a GPU or Mesa's software
+// renderer); without one the run is refused at the OpenGL check instead.
+TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
+  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
+  host.properties[FourCC("vers")] = kHostVersion18;
+  host.properties[FourCC("GPUF")] = 0x80;
+  static int prepared = 0;
+  prepared = 0;
+  const Tarsa::HostLensProfilesSuite lens{nullptr, nullptr, [] {
+                                            ++prepared;
+                                            return Tarsa::HostStatus(0);
+                                          }};
+  host.AddSuite(Tarsa::kLensProfilesSuite, 2, &lens);
+  host.record.flagByte94 = 5;
+  ScopedRecorder shown;
+  ASSERT_EQ(Call(Tarsa::kSelectorParameters), 0);
+  ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
+  const std::int16_t result = Call(Tarsa::kSelectorStart);
+  EXPECT_EQ(result, 1);
+  ASSERT_EQ(shown.texts.size(), 1u);
+  if (shown.texts[0].find("OpenGL") != std::string::npos) {
+    GTEST_SKIP() << "no OpenGL here: " << shown.texts[0];
+  }
+  EXPECT_EQ(shown.texts[0], "This build of Archway cannot solve corrections yet.");
+  EXPECT_EQ(host.propertyWrites.front(), std::make_pair(FourCC("wtch"), std::intptr_t(1)));
+  EXPECT_EQ(host.record.flagByte94, 0);
+  // Auto was forced, so the lens profiles were asked: the suite was taken,
+  // prepared once, and let go by the clean-up.
+  EXPECT_EQ(prepared, 1);
+  const std::string lensKey = std::string(Tarsa::kLensProfilesSuite) + "#2";
+  EXPECT_EQ(std::count(host.released.begin(), host.released.end(), lensKey), 1);
+  // A run that threw saves no preferences.
+  EXPECT_FALSE(config.HasPreferencesFile());
+  EXPECT_EQ(PFilter::Current(), nullptr);
+}
+
+}  // namespace
+}  // namespace Project::testing

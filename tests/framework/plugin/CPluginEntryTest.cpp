@@ -1,0 +1,149 @@
+#include "framework/plugin/CPluginEntry.h"
+
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+
+#include "framework/plugin/CFrameworkServices.h"
+#include "framework/plugin/CQuillmarkError.h"
+#include "framework/strings/CStringTable.h"
+#include "tests/framework/plugin/ProbeFilter.h"
+#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/process/RecordingPresenter.h"
+
+namespace Tarsa::testing {
+namespace {
+
+using Texts = std::vector<std::string>;
+
+class PluginEntry : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    CPluginEntry::TearDown();
+    ProbeFilter::Plan() = ProbeFilter::Script{};
+  }
+  void TearDown() override { CPluginEntry::TearDown(); }
+
+  static bool Exists() { return CQuillmarkFilter::Current() != nullptr; }
+  static int Made() { return ProbeFilter::Plan().made; }
+  static int Destroyed() { return ProbeFilter::Plan().destroyed; }
+
+  TestHost host;
+};
+
+TEST_F(PluginEntry, SelectorsOutsideTheTableAnswerZeroAndTouchNothing) {
+  for (std::int16_t selector :
+       {std::int16_t(-1), std::int16_t(-32768), std::int16_t(6), std::int16_t(300)}) {
+    EXPECT_EQ(ProbeFilter::Call(selector, &host.record), 0) << selector;
+  }
+  EXPECT_EQ(Made(), 0);
+  EXPECT_FALSE(CFrameworkServices::IsStarted());
+
+  // With an object alive they leave it as it is.
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
+  EXPECT_EQ(ProbeFilter::Call(9, &host.record), 0);
+  EXPECT_TRUE(Exists());
+  EXPECT_EQ(Destroyed(), 0);
+}
+
+TEST_F(PluginEntry, ContinueAndFinishWithoutAnObjectAnswerZero) {
+  EXPECT_EQ(ProbeFilter::Call(kSelectorContinue, &host.record), 0);
+  EXPECT_EQ(Made(), 0);
+  CFrameworkServices::Start();
+  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, nullptr), 0);
+  EXPECT_EQ(Made(), 0);
+  EXPECT_FALSE(CFrameworkServices::IsStarted()) << "finish shuts the framework down regardless";
+}
+
+TEST_F(PluginEntry, InteractiveRunKeepsOneObjectFromParametersToFinish) {
+  host.record.memoryOffer = 1 << 20;
+  EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
+  ASSERT_TRUE(Exists());
+  EXPECT_TRUE(CFrameworkServices::IsMainThread());
+  EXPECT_TRUE(CQuillmarkFilter::Current()->IsInteractive());
+  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 0);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 0);
+  EXPECT_TRUE(CQuillmarkFilter::Current()->IsInteractive()) << "same object as parameters";
+  ProbeFilter::Plan().proceed = false;
+  EXPECT_EQ(ProbeFilter::Call(kSelectorContinue, &host.record), 1);
+  EXPECT_TRUE(Exists()) << "continue keeps the object whatever it answers";
+  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
+  EXPECT_FALSE(Exists());
+  EXPECT_EQ(Made(), 1);
+  EXPECT_EQ(Destroyed(), 1);
+  EXPECT_EQ(ProbeFilter::Plan().finished, 1);
+  EXPECT_FALSE(CFrameworkServices::IsStarted());
+}
+
+TEST_F(PluginEntry, ScriptedRunBeginsAtPrepareWithAFreshNonInteractiveObject) {
+  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 0);
+  ASSERT_TRUE(Exists());
+  EXPECT_FALSE(CQuillmarkFilter::Current()->IsInteractive());
+  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 0);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
+  EXPECT_EQ(Made(), 1);
+  EXPECT_EQ(Destroyed(), 1);
+}
+
+TEST_F(PluginEntry, AFailingAnswerTearsTheObjectDown) {
+  ProbeFilter::Plan().parameters = false;
+  EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 1);
+  EXPECT_FALSE(Exists());
+  ProbeFilter::Plan().prepare = false;
+  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 1);
+  EXPECT_FALSE(Exists());
+  ProbeFilter::Plan().start = false;  // a cancelled run answers 1
+  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 1);
+  EXPECT_FALSE(Exists());
+  EXPECT_EQ(Made(), 3);
+  EXPECT_EQ(Destroyed(), 3);
+}
+
+TEST_F(PluginEntry, AboutMakesItsOwnObjectAndNeverKeepsIt) {
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorAbout, &host.record), 0);
+  EXPECT_FALSE(Exists());
+  EXPECT_EQ(Made(), 2);
+  EXPECT_EQ(Destroyed(), 2);
+}
+
+TEST_F(PluginEntry, ThrownFailuresBecomeTheAnswerAndTearDown) {
+  struct Case {
+    std::function<void()> thrower;
+    std::int16_t answer;
+    Texts shown;
+  };
+  const std::string kDefault = "The operation could not be completed.";
+  const std::vector<Case> cases = {
+      // The host's own error is its answer, and the host tells the user.
+      {[] { throw CQuillmarkError(-108); }, -108, {}},
+      {[] { throw CQuillmarkError(-34); }, -34, {}},
+      // A cancel is silent.
+      {[] { throw CAbort(); }, 1, {}},
+      {[] { throw CError("$$$/Test/Entry/Own=Own words."); }, 1, {"Own words."}},
+      // Foreign failures are worded by the framework, never by their text.
+      {[] { throw std::runtime_error("internal detail"); }, 1, {kDefault}},
+      {[] { throw 42; }, 1, {kDefault}},
+  };
+  for (const Case& c : cases) {
+    ScopedRecorder shown;
+    ProbeFilter::Plan().onStart = c.thrower;
+    EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), c.answer);
+    EXPECT_EQ(shown.texts, c.shown);
+    EXPECT_EQ(shown.beeps, 0);
+    EXPECT_FALSE(Exists());
+  }
+  EXPECT_EQ(Destroyed(), int(cases.size()));
+}
+
+TEST_F(PluginEntry, ShutdownDropsTheStringTable) {
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
+  EXPECT_NE(CStringTable::Get(false), nullptr);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
+  EXPECT_EQ(CStringTable::Get(false), nullptr);
+}
+
+}  // namespace
+}  // namespace Tarsa::testing
