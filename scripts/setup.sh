@@ -7,6 +7,8 @@ packages=(
   googletest libgtest-dev libgmock-dev libbenchmark-dev
   clang-format g++-multilib
   libtiff-dev libpng-dev libjpeg-dev
+  libegl-dev libgl-dev libglu1-mesa-dev libegl-mesa0 libgl1-mesa-dri
+  libsdl2-dev
 )
 
 missing=()

@@ -1,0 +1,103 @@
+#include "host/plugin/BlockExchange.h"
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+#include <new>
+
+#include "host/plugin/HostCodes.h"
+
+namespace Host {
+
+BlockExchange::BlockExchange(HostDocument& document, Tarsa::HostFilterRecord& record)
+    : document_(document), record_(record) {}
+
+BlockExchange::~BlockExchange() = default;
+
+Tarsa::HostRect32 BlockExchange::RequestedRect() const {
+  if (record_.coordinates32 != nullptr && record_.coordinates32->enabled != 0) {
+    return record_.coordinates32->outRect;
+  }
+  const Tarsa::HostRect16& r = record_.outRect16;
+  return {r.top, r.left, r.bottom, r.right};
+}
+
+bool BlockExchange::HasRequest() const {
+  const Tarsa::HostRect32 r = RequestedRect();
+  return r.top < r.bottom && r.left < r.right;
+}
+
+template <typename Sample>
+void BlockExchange::Transfer(const Block& block, bool toDocument) {
+  const int planes = block.lastPlane - block.firstPlane + 1;
+  const size_t width = static_cast<size_t>(document_.Width());
+  const int32_t columns = block.rect.right - block.rect.left;
+  const Sample max = static_cast<Sample>(document_.MaxSample());
+  for (int p = 0; p < planes; ++p) {
+    Sample* plane;
+    if constexpr (sizeof(Sample) == 1) {
+      plane = document_.Plane8(block.firstPlane + p).data();
+    } else {
+      plane = document_.Plane16(block.firstPlane + p).data();
+    }
+    for (int32_t y = block.rect.top; y < block.rect.bottom; ++y) {
+      Sample* row = plane + static_cast<size_t>(y) * width + static_cast<size_t>(block.rect.left);
+      auto* cells =
+          reinterpret_cast<Sample*>(block.bytes.get() +
+                                    static_cast<size_t>(y - block.rect.top) * block.rowBytes) +
+          p;
+      if (toDocument) {
+        for (int32_t x = 0; x < columns; ++x) row[x] = std::min(cells[x * planes], max);
+      } else {
+        for (int32_t x = 0; x < columns; ++x) cells[x * planes] = row[x];
+      }
+    }
+  }
+}
+
+void BlockExchange::Commit() {
+  if (out_ == nullptr) return;
+  const std::unique_ptr<Block> block = std::move(out_);
+  if (document_.Depth() == 16) {
+    Transfer<uint16_t>(*block, true);
+  } else {
+    Transfer<uint8_t>(*block, true);
+  }
+}
+
+int16_t BlockExchange::Advance() {
+  Commit();
+  record_.outData = nullptr;
+  record_.outRowBytes = 0;
+  if (!HasRequest()) return HostCodes::kNoError;
+
+  auto block = std::make_unique<Block>();
+  block->rect = RequestedRect();
+  block->firstPlane = record_.outFirstPlane;
+  block->lastPlane = record_.outLastPlane;
+  const Tarsa::HostRect32& r = block->rect;
+  if (r.top < 0 || r.left < 0 || r.bottom > document_.Height() || r.right > document_.Width() ||
+      block->firstPlane < 0 || block->lastPlane < block->firstPlane ||
+      block->lastPlane >= document_.PlaneCount()) {
+    return HostCodes::kParamErr;
+  }
+  const size_t planes = static_cast<size_t>(block->lastPlane - block->firstPlane + 1);
+  block->rowBytes = static_cast<size_t>(r.right - r.left) * planes * (document_.Depth() / 8);
+  const size_t rows = static_cast<size_t>(r.bottom - r.top);
+  if (block->rowBytes > static_cast<size_t>(std::numeric_limits<int32_t>::max())) {
+    return HostCodes::kMemFullErr;
+  }
+  block->bytes.reset(new (std::nothrow) uint8_t[block->rowBytes * rows]);
+  if (block->bytes == nullptr) return HostCodes::kMemFullErr;
+  if (document_.Depth() == 16) {
+    Transfer<uint16_t>(*block, false);
+  } else {
+    Transfer<uint8_t>(*block, false);
+  }
+  record_.outData = block->bytes.get();
+  record_.outRowBytes = static_cast<int32_t>(block->rowBytes);
+  out_ = std::move(block);
+  return HostCodes::kNoError;
+}
+
+}  // namespace Host

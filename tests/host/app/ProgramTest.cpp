@@ -1,0 +1,270 @@
+// The program end to end, run as users run it: with the fake module, whose
+// run is fully known, and with the real module when the build has it.
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+#include <vector>
+
+#include "framework/plugin/HostSuites.h"
+#include "host/actions/ActionFile.h"
+#include "host/io/ImageFile.h"
+#include "tests/host/io/TestImages.h"
+
+namespace Host {
+namespace {
+
+using Tarsa::FourCC;
+using Testing::ReadBytes;
+using Testing::ScratchFolder;
+
+struct Result {
+  int status = -1;
+  std::string output;
+  std::string errors;
+};
+
+std::string Quoted(const std::string& text) {
+  std::string quoted = "'";
+  for (char c : text) quoted += c == '\'' ? std::string("'\\''") : std::string(1, c);
+  return quoted + "'";
+}
+
+// Runs the program with its output captured, in files outside the folder.
+Result RunProgram(const std::vector<std::string>& arguments) {
+  const ScratchFolder capture;
+  std::string command = Quoted(ARCHWAY_RUNNER);
+  for (const std::string& argument : arguments) command += " " + Quoted(argument);
+  const std::string output = capture.File("stdout"), errors = capture.File("stderr");
+  const int raw = std::system(
+      (command + " >" + Quoted(output) + " 2>" + Quoted(errors) + " </dev/null").c_str());
+  Result result;
+  result.status = WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+  result.output = ReadBytes(output);
+  result.errors = ReadBytes(errors);
+  return result;
+}
+
+bool HasLine(const std::string& text, const std::string& line) {
+  return ("\n" + text).find("\n" + line + "\n") != std::string::npos;
+}
+
+struct Sample {
+  const char* name;
+  ImageMode mode;
+  bool transparency;
+};
+
+// Every mode in TIFF, the PNG and JPEG ones, with and without transparency.
+const Sample kSamples[] = {
+    {"gray.tif", ImageMode::kGray, false},    {"rgb.tif", ImageMode::kRgb, true},
+    {"cmyk.tif", ImageMode::kCmyk, true},     {"lab.tif", ImageMode::kLab, false},
+    {"gray16.tif", ImageMode::kGray16, true}, {"rgb48.tif", ImageMode::kRgb48, false},
+    {"lab48.tif", ImageMode::kLab48, true},   {"cmyk64.tif", ImageMode::kCmyk64, false},
+    {"gray.png", ImageMode::kGray, false},    {"rgba.png", ImageMode::kRgb, true},
+    {"gray16.png", ImageMode::kGray16, true}, {"rgb48.png", ImageMode::kRgb48, false},
+    {"gray.jpg", ImageMode::kGray, false},    {"rgb.jpg", ImageMode::kRgb, false},
+    {"cmyk.jpg", ImageMode::kCmyk, false},
+};
+
+// Writes the samples into the folder; returns their bytes, in order.
+std::vector<std::string> WriteSamples(const ScratchFolder& folder) {
+  std::vector<std::string> bytes;
+  uint32_t seed = 100;
+  for (const Sample& sample : kSamples) {
+    auto document = Testing::RandomDocument(13, 9, sample.mode, sample.transparency, seed++);
+    ImageFile::Write(*document, folder.File(sample.name));
+    bytes.push_back(ReadBytes(folder.File(sample.name)));
+  }
+  return bytes;
+}
+
+std::string ResultName(const std::string& name) {
+  const size_t dot = name.rfind('.');
+  return name.substr(0, dot) + "-archway" + name.substr(dot);
+}
+
+class ProgramTest : public ::testing::Test {
+ protected:
+  ScratchFolder folder_;
+  const std::string module_ = ARCHWAY_FAKE_MODULE;
+};
+
+TEST_F(ProgramTest, ApplyCorrectsAFolderOfEveryKindAndLeavesTheInputsAsTheyWere) {
+  const std::vector<std::string> before = WriteSamples(folder_);
+  const Result result = RunProgram({"apply", "--module", module_, folder_.File("")});
+  ASSERT_EQ(result.status, 0) << result.errors;
+  EXPECT_EQ(result.errors, "");
+  for (size_t i = 0; i < std::size(kSamples); ++i) {
+    const Sample& sample = kSamples[i];
+    SCOPED_TRACE(sample.name);
+    EXPECT_EQ(ReadBytes(folder_.File(sample.name)), before[i]);
+    const auto input = ImageFile::Read(folder_.File(sample.name));
+    const auto output = ImageFile::Read(folder_.File(ResultName(sample.name)));
+    ASSERT_EQ(output->Mode(), input->Mode());
+    ASSERT_EQ(output->PlaneCount(), input->PlaneCount());
+    if (std::string(sample.name).ends_with(".jpg")) continue;  // lossy
+    // The fake module inverts the colour planes and leaves transparency.
+    for (int p = 0; p < input->PlaneCount(); ++p) {
+      for (int y = 0; y < input->Height(); ++y) {
+        for (int x = 0; x < input->Width(); ++x) {
+          const int v = input->Sample(p, x, y);
+          const int expected = p < input->ColourPlanes() ? input->MaxSample() - v : v;
+          ASSERT_EQ(output->Sample(p, x, y), expected) << p << " " << x << " " << y;
+        }
+      }
+    }
+  }
+}
+
+TEST_F(ProgramTest, RefusalsOfTheModuleReachTheUserAndWriteNothing) {
+  auto document = Testing::RandomDocument(8, 8, ImageMode::kRgb, false, 1);
+  const std::string input = folder_.File("photo.tif");
+  ImageFile::Write(*document, input);
+  const std::string listing = folder_.Listing();
+
+  Result result = RunProgram({"apply", "--module", module_, "--host-version", "17", input});
+  EXPECT_NE(result.status, 0);
+  EXPECT_TRUE(
+      HasLine(result.errors, "This feature is not supported by the current version of Quillmark."))
+      << result.errors;
+  result = RunProgram({"apply", "--module", module_, "--no-gpu", input});
+  EXPECT_NE(result.status, 0);
+  EXPECT_NE(result.errors.find("graphics processor"), std::string::npos) << result.errors;
+  // The interactive run asks for parameters first; this module has no workspace.
+  result = RunProgram({"edit", "--module", module_, input});
+  EXPECT_NE(result.status, 0);
+  EXPECT_NE(result.errors.find("stopped at parameters"), std::string::npos) << result.errors;
+  EXPECT_EQ(folder_.Listing(), listing);
+}
+
+TEST_F(ProgramTest, SavedActionsReplay) {
+  auto document = Testing::RandomDocument(8, 8, ImageMode::kGray, false, 2);
+  const std::string input = folder_.File("photo.png");
+  ImageFile::Write(*document, input);
+  const std::string first = folder_.File("first.action");
+  const std::string second = folder_.File("second.action");
+
+  Result result = RunProgram({"apply", "--module", module_, "--save-action", first, input});
+  ASSERT_EQ(result.status, 0) << result.errors;
+  const Descriptor saved = ActionFile::Read(first);
+  EXPECT_EQ(saved.Find(FourCC("runs"))->integer, 1);
+  EXPECT_EQ(saved.Find(FourCC("plip"))->integer, 0);  // nothing to replay yet
+  const std::u16string title = u"photo.png";
+  EXPECT_EQ(saved.Find(FourCC("titl"))->data,
+            std::vector<uint8_t>(reinterpret_cast<const uint8_t*>(title.data()),
+                                 reinterpret_cast<const uint8_t*>(title.data() + title.size())));
+
+  result = RunProgram({"apply", "--module", module_, "--action", first, "--save-action", second,
+                       "-o", folder_.File("again.png"), input});
+  ASSERT_EQ(result.status, 0) << result.errors;
+  const Descriptor replayed = ActionFile::Read(second);
+  EXPECT_EQ(replayed.Find(FourCC("runs"))->integer, 2);
+  EXPECT_EQ(replayed.Find(FourCC("plip"))->integer, 1);
+  EXPECT_EQ(ReadBytes(folder_.File("again.png")), ReadBytes(folder_.File("photo-archway.png")));
+
+  // A damaged action is refused before any image is touched.
+  Testing::WriteBytes(first, "archway-action 1\nruns integer one\n");
+  result = RunProgram({"apply", "--module", module_, "--action", first, input});
+  EXPECT_EQ(result.status, 1);
+  EXPECT_NE(result.errors.find(first + "': line 2:"), std::string::npos) << result.errors;
+}
+
+TEST_F(ProgramTest, FailuresAndCtrlCLeaveNoOutput) {
+  auto document = Testing::RandomDocument(8, 8, ImageMode::kRgb48, false, 3);
+  const std::string good = folder_.File("good.tif");
+  ImageFile::Write(*document, good);
+  const std::string damaged = folder_.File("damaged.tif");
+  Testing::WriteBytes(damaged, ReadBytes(good).substr(0, 100));
+
+  // A damaged image fails alone; the others are still corrected.
+  Result result = RunProgram({"apply", "--module", module_, damaged, good});
+  EXPECT_EQ(result.status, 1);
+  EXPECT_NE(result.errors.find(damaged), std::string::npos) << result.errors;
+  EXPECT_TRUE(std::filesystem::exists(folder_.File("good-archway.tif")));
+  EXPECT_FALSE(std::filesystem::exists(folder_.File("damaged-archway.tif")));
+  std::filesystem::remove(folder_.File("good-archway.tif"));
+
+  Descriptor steer;
+  steer.PutInteger(FourCC("fail"), 1);
+  ActionFile::Write(steer, folder_.File("fail.action"));
+  Descriptor interrupt;
+  interrupt.PutInteger(FourCC("intr"), 1);
+  ActionFile::Write(interrupt, folder_.File("intr.action"));
+  const std::string listing = folder_.Listing();
+  result =
+      RunProgram({"apply", "--module", module_, "--action", folder_.File("fail.action"), good});
+  EXPECT_EQ(result.status, 1);
+  EXPECT_NE(result.errors.find("not corrected: the module stopped at start"), std::string::npos)
+      << result.errors;
+
+  // The module raises SIGINT itself, as Ctrl-C would, then asks for the abort.
+  result = RunProgram(
+      {"apply", "--module", module_, "--action", folder_.File("intr.action"), good, damaged});
+  EXPECT_EQ(result.status, 130);
+  EXPECT_NE(result.errors.find("interrupted"), std::string::npos) << result.errors;
+  EXPECT_EQ(result.errors.find("damaged"), std::string::npos) << "a later image was started";
+  EXPECT_EQ(folder_.Listing(), listing);  // no result and no temporary file
+
+  result = RunProgram({"apply", "--module", folder_.File("missing.so"), good});
+  EXPECT_EQ(result.status, 1);
+  EXPECT_NE(result.errors.find("missing.so"), std::string::npos) << result.errors;
+  // A result the chosen format cannot hold is refused before the module runs.
+  ImageFile::Write(*Testing::RandomDocument(4, 4, ImageMode::kCmyk, false, 4),
+                   folder_.File("cmyk.tif"));
+  result = RunProgram(
+      {"apply", "--module", module_, "-o", folder_.File("out.png"), folder_.File("cmyk.tif")});
+  EXPECT_EQ(result.status, 1);
+  EXPECT_NE(result.errors.find("PNG cannot hold"), std::string::npos) << result.errors;
+  EXPECT_FALSE(std::filesystem::exists(folder_.File("out.png")));
+}
+
+TEST_F(ProgramTest, HelpDescribesEveryOption) {
+  const Result result = RunProgram({"--help"});
+  EXPECT_EQ(result.status, 0);
+  for (const char* option : {"apply", "edit", "--action", "--save-action", "--output", "--module",
+                             "--no-gpu", "--host-version", "ARCHWAY_MODULE", "130"}) {
+    EXPECT_NE(result.output.find(option), std::string::npos) << option;
+  }
+  EXPECT_EQ(RunProgram({"apply"}).status, 2);
+}
+
+#ifdef ARCHWAY_REAL_MODULE
+// The real module, as far as its run flow goes today: every kind of file
+// reaches its start, its refusals come in its own words, inputs stay as
+// they were.
+TEST_F(ProgramTest, TheRealModuleIsReachedForEveryKindOfFile) {
+  const std::vector<std::string> before = WriteSamples(folder_);
+  const std::string module = ARCHWAY_REAL_MODULE;
+  for (size_t i = 0; i < std::size(kSamples); ++i) {
+    const std::string input = folder_.File(kSamples[i].name);
+    SCOPED_TRACE(kSamples[i].name);
+    Result result = RunProgram({"apply", "--module", module, input});
+    EXPECT_TRUE(result.status == 0 || result.errors.find("stopped at start") != std::string::npos)
+        << result.errors;
+    EXPECT_EQ(std::filesystem::exists(folder_.File(ResultName(kSamples[i].name))),
+              result.status == 0);
+    result = RunProgram({"apply", "--module", module, "--host-version", "17", input});
+    EXPECT_NE(result.status, 0);
+    // The module words its refusals itself, in its alert's form.
+    EXPECT_NE(
+        result.errors.find("This feature is not supported by the current version of Quillmark.\n"),
+        std::string::npos)
+        << result.errors;
+    result = RunProgram({"apply", "--module", module, "--no-gpu", input});
+    EXPECT_NE(result.status, 0);
+    EXPECT_NE(result.errors.find("This feature requires graphics processor acceleration. Please "
+                                 "check the Performance Preferences and verify that 'Use Graphics "
+                                 "Processor' is enabled."),
+              std::string::npos)
+        << result.errors;
+    EXPECT_EQ(ReadBytes(input), before[i]);
+  }
+}
+#endif
+
+}  // namespace
+}  // namespace Host

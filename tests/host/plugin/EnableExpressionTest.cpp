@@ -1,0 +1,76 @@
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "host/io/HostError.h"
+#include "host/plugin/EnableExpression.h"
+#include "host/plugin/PluginModule.h"
+#include "tests/host/io/TestImages.h"
+
+namespace Host {
+namespace {
+
+TEST(EnableExpressionTest, TheModulesExpressionAllowsItsEightModes) {
+  const EnableExpression expression = EnableExpression::Parse(
+      "in (QMARK_ImageMode, GrayScaleMode, Gray16Mode, RGBMode, RGB48Mode, LabMode, Lab48Mode, "
+      "CMYKMode, CMYK64Mode)");
+  const std::vector<ImageMode> all = {ImageMode::kGray,  ImageMode::kRgb,    ImageMode::kCmyk,
+                                      ImageMode::kLab,   ImageMode::kGray16, ImageMode::kRgb48,
+                                      ImageMode::kLab48, ImageMode::kCmyk64};
+  EXPECT_EQ(expression.AllowedModes(), all);
+}
+
+TEST(EnableExpressionTest, ModesLeftOutAreRefused) {
+  // BitmapMode names a mode the host never holds: accepted, allows nothing.
+  const EnableExpression expression =
+      EnableExpression::Parse("in(QMARK_ImageMode,RGBMode , BitmapMode,Gray16Mode)");
+  EXPECT_TRUE(expression.Allows(ImageMode::kRgb));
+  EXPECT_TRUE(expression.Allows(ImageMode::kGray16));
+  EXPECT_FALSE(expression.Allows(ImageMode::kCmyk));
+  EXPECT_FALSE(expression.Allows(ImageMode::kGray));
+  EXPECT_EQ(expression.AllowedModes().size(), 2u);
+}
+
+TEST(EnableExpressionTest, MalformedExpressionsAreErrors) {
+  const char* malformed[] = {
+      "",
+      "in QMARK_ImageMode",
+      "in (RGBMode)",
+      "in (QMARK_ImageMode, RGBMode",
+      "in (QMARK_ImageMode RGBMode)",
+      "in (QMARK_ImageMode, RGB)",
+      "in (QMARK_ImageMode, , RGBMode)",
+      "in (QMARK_ImageMode, RGBMode) || true",
+  };
+  for (const char* text : malformed) {
+    EXPECT_THROW(EnableExpression::Parse(text), HostError) << text;
+  }
+}
+
+TEST(PluginModuleTest, ReadsTheModulesPropertiesWithoutLoadingIt) {
+  const auto module = PluginModule::Inspect(ARCHWAY_FAKE_MODULE);
+  EXPECT_FALSE(module->Loaded());
+  EXPECT_EQ(module->Enabled().AllowedModes().size(), 8u);
+  const auto document = HostDocument::Create(2, 2, ImageMode::kLab48);
+  EXPECT_EQ(module->Refusal(*document), "");
+  module->Load();
+  EXPECT_NE(module->Entry(), nullptr);
+}
+
+TEST(PluginModuleTest, FilesThatAreNotModulesAreRefusedByName) {
+  Testing::ScratchFolder folder;
+  const std::string text = folder.File("notes.so");
+  Testing::WriteBytes(text, "not a module");
+  for (const std::string& path : {text, folder.File("missing.so")}) {
+    try {
+      PluginModule::Inspect(path);
+      ADD_FAILURE() << path;
+    } catch (const HostError& error) {
+      EXPECT_NE(std::string(error.what()).find(path), std::string::npos) << error.what();
+    }
+  }
+}
+
+}  // namespace
+}  // namespace Host
