@@ -1,0 +1,34 @@
+#pragma once
+
+#include "lens/sphere/PhotoToSphere.h"
+
+namespace Project {
+
+// An equisolid-angle fisheye centred on the picture: a direction at angle t
+// from the view axis lands at radius 2 focal sin(t / 2). The focal solver
+// builds one of these for every trial focal length.
+class FisheyeImage : public PhotoToSphere {
+ public:
+  // focal in pixels. The centre is kept for whoever built the model; the
+  // projection is always about the middle of the picture.
+  FisheyeImage(std::shared_ptr<const Image> image, float focal, float centerX, float centerY);
+
+  // The front half sphere: t below 90 degrees.
+  bool Contains(float lon, float lat) const override;
+  void GetPosition(float lon, float lat, float& x, float& y) const override;
+
+  float GetFocal() const { return focal_; }
+  float GetCenterX() const { return centerX_; }
+  float GetCenterY() const { return centerY_; }
+
+ private:
+  // The radius of the angle from the view axis, 2 focal sin(t / 2).
+  float Radius(float lon, float lat) const;
+
+  const float focal_;
+  const float limitRadius_;  // the radius at 90 degrees, focal sqrt(2)
+  const float centerX_;
+  const float centerY_;
+};
+
+}  // namespace Project
