@@ -11,6 +11,8 @@
 #include "framework/files/CDirectory.h"
 #include "framework/native/NativeDisplay.h"
 #include "framework/process/CReporter.h"
+#include "lens/metadata/PXmpMeta.h"
+#include "lens/sphere/ChoosePhotoToSphere.h"
 
 namespace Project {
 
@@ -71,6 +73,7 @@ PFilter::PFilter() { gPFilter = this; }
 
 PFilter::~PFilter() {
   if (lensSuite_ != nullptr) ReleaseSuite(Tarsa::kLensProfilesSuite, 2);
+  CloseMetadata();
   // The run's objects go before the hub, whose going ends OpenGL.
   preferences_.reset();
   settings_.reset();
@@ -212,12 +215,28 @@ bool PFilter::DoStart() {
 }
 
 void PFilter::OpenMetadata() {
-  // The photo's metadata object is made and loaded here, with the XMP
-  // toolkit opened once; both come with the lens support.
-  metadataToolkitOpen_ = 1;
+  if (metadataToolkitOpen_ == 0) metadataToolkitOpen_ = PXmpMeta::Initialize() ? 1 : 0;
+  photoInfo_ = std::make_unique<PhotoInfo>();
+  // Without the toolkit the photo stays unknown, which every user allows.
+  if (metadataToolkitOpen_ == 0) return;
+  const Tarsa::CRect image = ImageHub().ImageRect();
+  auto side = [](std::int64_t length) {
+    return std::uint32_t(std::clamp<std::int64_t>(length, 0, UINT32_MAX));
+  };
+  photoInfo_->Load(*this, side(image.Width()), side(image.Height()));
 }
 
-void PFilter::CloseMetadata() { metadataToolkitOpen_ = 0; }
+void PFilter::CloseMetadata() {
+  photoInfo_.reset();
+  if (metadataToolkitOpen_ != 0) PXmpMeta::Terminate();
+  metadataToolkitOpen_ = 0;
+}
+
+PFilter::FocalData PFilter::MetadataFocalData() const {
+  if (photoInfo_ == nullptr) return {};
+  return {photoInfo_->GetFocalLength(), photoInfo_->GetCropFactor(),
+          photoInfo_->GetFocalLength35mm(), photoInfo_->HasPanorama()};
+}
 
 void PFilter::EndRun() {
   if (lensSuite_ != nullptr) {
@@ -259,21 +278,44 @@ void PFilter::LoadBehaviorFile() {
 
 // ---- Projection model and focal length -------------------------------------------------
 
-bool PFilter::MatchLensProfile(bool /*warn*/) {
+bool PFilter::MatchLensProfile(bool warn) { return LensMatcher().MatchProfile(warn); }
+
+PLensMatcher& PFilter::LensMatcher() {
+  if (lensMatcher_ == nullptr) {
+    PLensMatcher::Run& run = *this;
+    lensMatcher_ = std::make_unique<PLensMatcher>(run);
+  }
+  return *lensMatcher_;
+}
+
+const Tarsa::HostLensProfilesSuite* PFilter::LensProfilesSuite() {
   if (lensSuite_ == nullptr) {
     lensSuite_ = static_cast<const Tarsa::HostLensProfilesSuite*>(
         AcquireSuite(Tarsa::kLensProfilesSuite, 2));
-    if (lensSuite_ == nullptr) return false;
+    if (lensSuite_ == nullptr) return nullptr;
     if (lensSuite_->prepare == nullptr || lensSuite_->prepare() != 0) {
       ReleaseSuite(Tarsa::kLensProfilesSuite, 2);
       lensSuite_ = nullptr;
-      return false;
     }
   }
-  // Choosing a profile from the host's candidates comes with the lens
-  // support; until then no profile matches.
-  cropRatio_ = 0;
-  return false;
+  return lensSuite_;
+}
+
+float PFilter::GetCropRatio() {
+  cropRatio_ =
+      photoInfo_ != nullptr ? PLensMatcher::CropRatio(Settings().lensRecord, *photoInfo_) : 0.0f;
+  return cropRatio_;
+}
+
+bool PFilter::ChooseSphereModel(const std::shared_ptr<const Image>& image,
+                                std::shared_ptr<PhotoToSphere>& model) {
+  const PSettings& settings = Settings();
+  PanoramaProjection panorama;
+  const bool hasPanorama = photoInfo_ != nullptr && photoInfo_->HasPanorama();
+  if (hasPanorama) panorama = photoInfo_->Panorama();
+  return ChoosePhotoToSphere(settings.projectionModel, image, settings.focalLength,
+                             hasPanorama ? &panorama : nullptr,
+                             settings.lensRecord.GetCameraModel(), cropRatio_, model);
 }
 
 void PFilter::ResolveProjectionModel(std::int32_t fallback, bool forceAuto, bool warn) {

@@ -8,6 +8,9 @@
 #include "filter/params/PPreferences.h"
 #include "filter/params/PSettings.h"
 #include "framework/plugin/CQuillmarkFilter.h"
+#include "lens/metadata/PhotoInfo.h"
+#include "lens/profiles/PLensMatcher.h"
+#include "lens/sphere/PhotoToSphere.h"
 
 namespace Project {
 
@@ -16,9 +19,10 @@ namespace Project {
 // decides in DoStart whether a run is interactive, scripted or refused, and
 // what goes back to the host. It owns, each made on first use and deleted
 // with it, the image hub (whose making starts OpenGL), the working settings
-// and the preferences; the host's lens profile suite is held for one run.
+// and the preferences; the photo's metadata and the host's lens profile
+// suite are held for one run.
 // The rest of the program reaches it through Current().
-class PFilter : public Tarsa::CQuillmarkFilter {
+class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run {
  public:
   // What the photo's metadata says about its focal length; zero is absent.
   struct FocalData {
@@ -52,6 +56,8 @@ class PFilter : public Tarsa::CQuillmarkFilter {
   PPreferences& Preferences();
   bool HasImageHub() const { return imageHub_ != nullptr; }
   bool HasPreferences() const { return preferences_ != nullptr; }
+  // The photo's metadata; null outside a run's start.
+  const PhotoInfo* Photo() const { return photoInfo_.get(); }
   bool Rendered() const { return rendered_ != 0; }
 
   // Where the filter's files live; empty when it cannot be had.
@@ -71,6 +77,18 @@ class PFilter : public Tarsa::CQuillmarkFilter {
   // The same as focal lengths in pixels.
   bool ImageFocalRange(float& low, float& high);
 
+  // The run's lens profile matcher, made at first use.
+  PLensMatcher& LensMatcher();
+  // The lens record's crop ratio to the photo (see PLensMatcher::CropRatio),
+  // kept for CropRatio().
+  float GetCropRatio();
+  float CropRatio() const { return cropRatio_; }
+  // The sphere model of the settings' projection model over image: the
+  // photo's panorama, or with Auto the matched profile's camera model and
+  // crop ratio. False, with model as it was, when none can be built.
+  bool ChooseSphereModel(const std::shared_ptr<const Image>& image,
+                         std::shared_ptr<PhotoToSphere>& model);
+
   // The scripting descriptor of the record's script block.
   bool ReadDescriptor(PSettings& target);
   void WriteDescriptor(const PSettings& source);
@@ -78,9 +96,8 @@ class PFilter : public Tarsa::CQuillmarkFilter {
   void LoadBehaviorFile();
 
  protected:
-  // The metadata's focal data. The photo's metadata is read with the lens
-  // support; until then every value is absent.
-  virtual FocalData MetadataFocalData() const { return FocalData{}; }
+  // The photo's focal data; every value absent outside a run's start.
+  virtual FocalData MetadataFocalData() const;
   // True when a lens profile of the photo was found and put in the settings.
   virtual bool MatchLensProfile(bool warn);
 
@@ -94,12 +111,22 @@ class PFilter : public Tarsa::CQuillmarkFilter {
   float KnownPhysicalFocal();
   std::int64_t LargerSide() const;
 
+  // The lens matcher's view of the run.
+  const Tarsa::HostBufferSuite* BasicSuite() override { return BufferSuite(); }
+  const Tarsa::HostLensProfilesSuite* LensProfilesSuite() override;
+  const PhotoInfo* LensPhoto() override { return photoInfo_.get(); }
+  PhotoInfo& LensRecord() override { return Settings().lensRecord; }
+  std::string& LensKey() override { return Settings().lensKey; }
+  float LensCropRatio() override { return GetCropRatio(); }
+
   std::unique_ptr<PImageHub> imageHub_;
   std::unique_ptr<PSettings> settings_;
   std::unique_ptr<PPreferences> preferences_;
+  std::unique_ptr<PhotoInfo> photoInfo_;
   std::uint8_t rendered_ = 0;
   std::uint8_t metadataToolkitOpen_ = 0;
   const Tarsa::HostLensProfilesSuite* lensSuite_ = nullptr;
+  std::unique_ptr<PLensMatcher> lensMatcher_;
   float cropRatio_ = 0;
 };
 

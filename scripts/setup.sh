@@ -9,6 +9,8 @@ packages=(
   libtiff-dev libpng-dev libjpeg-dev
   libegl-dev libgl-dev libglu1-mesa-dev libegl-mesa0 libgl1-mesa-dri
   libsdl2-dev
+  libexiv2-dev
+  libexempi-dev
 )
 
 missing=()

@@ -4,6 +4,7 @@
 #include <string>
 
 #include "framework/strings/CString.h"
+#include "lens/metadata/PhotoInfo.h"
 
 namespace Project {
 
@@ -82,9 +83,9 @@ class PSettings {
   float imageCenterY = 0.5f;
   std::uint8_t previewResult = 1;
   std::uint8_t constraintsVisible = 1;
-  // The photo's lens and camera description and its key. Opaque bytes for
-  // now: they become a typed record once lens profiles exist.
-  std::string lensRecord;
+  // The matched lens profile entry (its camera model included) and its
+  // key; blank until a profile matches. Neither is stored anywhere.
+  PhotoInfo lensRecord;
   std::string lensKey;
   std::uint8_t confirmCalibration = 1;
   std::uint8_t reservedFlagG = 0;

@@ -218,13 +218,51 @@ struct HostBufferSuite {
   void (*release)(void** block);
 };
 
-// The lens profile service. Entry 1 answers a query block (laid out by the
-// lens matching code); entry 2 is called once, with no arguments, right after
-// the suite is acquired.
+// The lens profile service. Entry 1 answers a query block; entry 2 is called
+// once, with no arguments, right after the suite is acquired.
 struct HostLensProfilesSuite {
   void* reserved0;
   HostStatus (*query)(void* queryBlock);
   HostStatus (*prepare)();
+};
+
+// One candidate profile in the lens service's answer. Every pointer is a
+// block of the buffer suite, freed by the filter. widePath holds the path as
+// zero-terminated UTF-16 and counts only when pathIsWide is set. On a 32-bit
+// build: path at 4, flagA at 28, pathIsWide at 30, cropFactor at 32, 36 bytes.
+struct HostLensResult {
+  char16_t* widePath;
+  char* path;
+  char* make;
+  char* model;
+  char* modelDisplay;
+  char* lens;
+  char* lensDisplay;
+  std::uint8_t flagA;
+  std::uint8_t flagB;
+  std::uint8_t pathIsWide;
+  std::uint8_t reserved31;
+  float cropFactor;
+};
+
+// The query block of entry 1. The filter fills the strings (buffer suite
+// blocks, its own) and the constants; the service fills the last two fields.
+// On a 32-bit build: cropFactor at 24, model at 32, results at 48, 56 bytes.
+struct HostLensQuery {
+  char* make;
+  char* reserved4;
+  char* lens;
+  char* reserved12;
+  char* reserved16;
+  std::int32_t reserved20;
+  float cropFactor;
+  std::int32_t reserved28;
+  char* model;
+  std::int32_t constant36;  // 1
+  std::int32_t constant40;  // 1
+  std::int32_t constant44;  // 0
+  HostLensResult** results;
+  std::uint32_t resultCount;
 };
 
 // The usage counters suite; the filter drops every call when it is absent.

@@ -82,7 +82,8 @@ int16_t BlockExchange::Advance() {
     return HostCodes::kParamErr;
   }
   const size_t planes = static_cast<size_t>(block->lastPlane - block->firstPlane + 1);
-  block->rowBytes = static_cast<size_t>(r.right - r.left) * planes * (document_.Depth() / 8);
+  block->rowBytes =
+      static_cast<size_t>(r.right - r.left) * planes * (document_.Depth() / 8) + rowPadding_;
   const size_t rows = static_cast<size_t>(r.bottom - r.top);
   if (block->rowBytes > static_cast<size_t>(std::numeric_limits<int32_t>::max())) {
     return HostCodes::kMemFullErr;

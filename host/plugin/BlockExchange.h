@@ -35,6 +35,9 @@ class BlockExchange {
   void Commit();
   // Whether the record asks for a block (a non-empty out rectangle).
   bool HasRequest() const;
+  // Bytes left unused at the end of each row of the blocks handed out, as a
+  // host that aligns its rows leaves them; 0 by default.
+  void SetRowPadding(size_t bytes) { rowPadding_ = bytes; }
 
  private:
   struct Block {
@@ -52,6 +55,7 @@ class BlockExchange {
   HostDocument& document_;
   Tarsa::HostFilterRecord& record_;
   std::unique_ptr<Block> out_;
+  size_t rowPadding_ = 0;
 };
 
 }  // namespace Host

@@ -2,6 +2,7 @@
 
 #include <cstring>
 
+#include "host/io/MetadataPacket.h"
 #include "host/plugin/HostCodes.h"
 #include "host/plugin/MemoryHandles.h"
 
@@ -27,6 +28,13 @@ Tarsa::HostError HostProperties::Get(uint32_t signature, uint32_t key, int32_t,
     *simpleValue = value;
     return HostCodes::kNoError;
   };
+  if (const auto found = overrides_.find(key); found != overrides_.end()) {
+    if (const auto* value = std::get_if<intptr_t>(&found->second)) return simple(*value);
+    if (const auto* bytes = std::get_if<std::string>(&found->second)) {
+      return Complex(complexValue, bytes->data(), bytes->size());
+    }
+    return HostCodes::kNotAvailable;
+  }
   switch (key) {
     case FourCC("vers"):
       return simple(static_cast<intptr_t>(static_cast<uint32_t>(settings_.majorVersion) << 16));
@@ -65,8 +73,12 @@ Tarsa::HostError HostProperties::Get(uint32_t signature, uint32_t key, int32_t,
       }
       return Complex(complexValue, list.data(), list.size());
     }
+    case FourCC("xmpd"): {
+      if (documentPath_.empty()) return HostCodes::kNotAvailable;
+      const std::string packet = MetadataPacket::FromFile(documentPath_);
+      return Complex(complexValue, packet.data(), packet.size());
+    }
     default:
-      // Among them `xmpd`: the document's metadata packet is not served yet.
       return HostCodes::kNotAvailable;
   }
 }

@@ -1,7 +1,9 @@
 #pragma once
 
 #include <cstdint>
+#include <map>
 #include <string>
+#include <variant>
 #include <vector>
 
 #include "framework/plugin/HostSuites.h"
@@ -43,12 +45,25 @@ class HostProperties {
   // Whether the filter has asked the host to hold its watch cursor.
   bool WatchSuspended() const { return watchSuspended_; }
 
+  // The image file whose metadata `xmpd` serves as an XMP packet, read when
+  // asked; with none, `xmpd` is not available.
+  void SetDocumentPath(std::string path) { documentPath_ = std::move(path); }
+
+  // A property answered with a chosen simple value or complex bytes instead
+  // of the host's own, or withheld (kNotAvailable): for trying a filter
+  // against other hosts.
+  void Override(uint32_t key, intptr_t simpleValue) { overrides_[key] = simpleValue; }
+  void Override(uint32_t key, std::string complexValue) { overrides_[key] = complexValue; }
+  void Withhold(uint32_t key) { overrides_[key] = std::monostate(); }
+
   // UTF-8 to UTF-16 code units; a malformed byte becomes U+FFFD.
   static std::u16string Utf16(const std::string& text);
 
  private:
   Settings settings_;
   bool watchSuspended_ = false;
+  std::string documentPath_;
+  std::map<uint32_t, std::variant<std::monostate, intptr_t, std::string>> overrides_;
 };
 
 }  // namespace Host

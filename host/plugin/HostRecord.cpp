@@ -75,6 +75,7 @@ HostRecord::HostRecord(HostDocument& document, Settings settings, RunObserver& o
       channels_(std::make_unique<DocumentChannels>(document)),
       blocks_(std::make_unique<BlockExchange>(document, *record_)),
       properties_(std::make_unique<HostProperties>(std::move(settings.properties))) {
+  properties_->SetDocumentPath(document.SourcePath());
   const int32_t width = document.Width();
   const int32_t height = document.Height();
   Tarsa::HostFilterRecord& r = *record_;

@@ -46,6 +46,7 @@ class HostRecord {
 
   Tarsa::HostFilterRecord* Record() { return record_.get(); }
   BlockExchange& Blocks() { return *blocks_; }
+  HostProperties& Properties() { return *properties_; }
 
   // Puts a descriptor for the filter to read into the script block.
   void SetDescriptor(const Descriptor& descriptor);

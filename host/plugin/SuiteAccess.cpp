@@ -6,6 +6,7 @@
 #include "host/plugin/DocumentChannels.h"
 #include "host/plugin/HostBuffers.h"
 #include "host/plugin/HostCodes.h"
+#include "host/plugin/LensProfileService.h"
 
 namespace Host {
 
@@ -54,14 +55,22 @@ const void* Workspace() { return &kUnavailable; }
 const void* Buffers() { return HostBuffers::Suite(); }
 const void* Ports() { return DocumentChannels::PortsSuite(); }
 const void* Descriptors() { return DescriptorSuite::Table(); }
+const void* LensProfiles() { return LensProfileService::Suite(); }
 
 constexpr Served kServed[] = {
-    {Tarsa::kChannelPortsSuite, 3, 3, Ports}, {Tarsa::kSwiftViewSuite, 3, 3, Strings},
-    {Tarsa::kUtilitiesSuite, 1, 1, Strings},  {Tarsa::kPaletteSuite, 1, 1, Palette},
-    {Tarsa::kZStringSuite, 1, 1, Strings},    {Tarsa::kZStringDictionarySuite, 1, 1, Strings},
-    {Tarsa::kUIHooksSuite, 1, 4, Workspace},  {Tarsa::kMouseTrackingSuite, 3, 4, Workspace},
-    {Tarsa::kHelpSuite, 1, 2, Workspace},     {Tarsa::kBufferSuite, 1, 1, Buffers},
-    {Tarsa::kLookoutSuite, 1, 1, Lookout},    {Tarsa::kDescriptorSuite, 5, 5, Descriptors},
+    {Tarsa::kChannelPortsSuite, 3, 3, Ports},
+    {Tarsa::kSwiftViewSuite, 3, 3, Strings},
+    {Tarsa::kUtilitiesSuite, 1, 1, Strings},
+    {Tarsa::kPaletteSuite, 1, 1, Palette},
+    {Tarsa::kZStringSuite, 1, 1, Strings},
+    {Tarsa::kZStringDictionarySuite, 1, 1, Strings},
+    {Tarsa::kUIHooksSuite, 1, 4, Workspace},
+    {Tarsa::kMouseTrackingSuite, 3, 4, Workspace},
+    {Tarsa::kHelpSuite, 1, 2, Workspace},
+    {Tarsa::kBufferSuite, 1, 1, Buffers},
+    {Tarsa::kLookoutSuite, 1, 1, Lookout},
+    {Tarsa::kDescriptorSuite, 5, 5, Descriptors},
+    {Tarsa::kLensProfilesSuite, 2, 2, LensProfiles},
 };
 
 Tarsa::HostStatus Acquire(const char* name, int32_t version, const void** suite) {

@@ -5,12 +5,8 @@
 #include <EGL/eglext.h>
 #include <GL/gl.h>
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cstdint>
-#include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <string>
 #include <vector>
 
@@ -27,26 +23,6 @@ inline std::vector<std::uint8_t> ReadPixels(int width, int height) {
   glReadPixels(0, 0, width, height, GL_RGBA, GL_UNSIGNED_BYTE, pixels.data());
   return pixels;
 }
-
-inline std::string ReadFile(const std::filesystem::path& path) {
-  std::ifstream file(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(file), std::istreambuf_iterator<char>()};
-}
-
-// A folder of the running test's own, removed with the object.
-struct ScratchFolder {
-  ScratchFolder() {
-    const testing::TestInfo* test = testing::UnitTest::GetInstance()->current_test_info();
-    path = std::filesystem::temp_directory_path() /
-           ("archway_gpu_" + std::to_string(getpid()) + "_" + test->name());
-    std::filesystem::create_directories(path);
-  }
-  ~ScratchFolder() { std::filesystem::remove_all(path); }
-  ScratchFolder(const ScratchFolder&) = delete;
-  ScratchFolder& operator=(const ScratchFolder&) = delete;
-
-  std::filesystem::path path;
-};
 
 // The host's own OpenGL context on the surfaceless display, current while
 // the object lives. The display is left initialised, as the manager leaves

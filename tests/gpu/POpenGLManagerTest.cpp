@@ -2,18 +2,19 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <string>
 
 #include "tests/gpu/GpuTestSupport.h"
+#include "tests/support/TestSupport.h"
 
 namespace Project {
 namespace {
 
 using GpuTest::ForeignContext;
 using GpuTest::kShaderFile;
-using GpuTest::ReadFile;
 using GpuTest::ReadPixels;
-using GpuTest::ScratchFolder;
+using TestSupport::ReadBytes;
 
 constexpr int kSize = POpenGLManager::kSurfaceSize;
 
@@ -113,25 +114,24 @@ TEST(POpenGLManager, LeavesTheHostsContextCurrent) {
 }
 
 TEST(POpenGLManager, ShaderResultIsLogged) {
-  ScratchFolder folder;
-  const std::filesystem::path log = folder.path / "Shader Result.log";
-  POpenGLManager manager(GL_RGBA8, folder.path.string());
+  TestSupport::ScratchFolder folder;
+  const std::string log = folder.File("Shader Result.log");
+  POpenGLManager manager(GL_RGBA8, folder.Dir());
   manager.SetShaderPath(kShaderFile);
   ASSERT_TRUE(manager.Initialize());
   EXPECT_TRUE(manager.ShaderReady());
-  EXPECT_EQ(ReadFile(log), "Shader Linked Success.\n");
+  EXPECT_EQ(ReadBytes(log), "Shader Linked Success.\n");
 
-  const std::filesystem::path broken = folder.path / "broken.fsh";
-  std::ofstream(broken) << "#version 120\nvoid main() { gl_FragColor = undefinedThing; }\n";
-  manager.SetShaderPath(broken.string());
+  folder.Put("broken.fsh", "#version 120\nvoid main() { gl_FragColor = undefinedThing; }\n");
+  manager.SetShaderPath(folder.File("broken.fsh"));
   ASSERT_TRUE(manager.Initialize());
   EXPECT_TRUE(manager.FramebufferPath());
   EXPECT_FALSE(manager.ShaderReady());
-  EXPECT_NE(ReadFile(log).find("undefinedThing"), std::string::npos) << ReadFile(log);
+  EXPECT_NE(ReadBytes(log).find("undefinedThing"), std::string::npos) << ReadBytes(log);
 
   // No file: no shader and no log, the path still stands.
   std::filesystem::remove(log);
-  manager.SetShaderPath((folder.path / "absent.fsh").string());
+  manager.SetShaderPath(folder.File("absent.fsh"));
   ASSERT_TRUE(manager.Initialize());
   EXPECT_TRUE(manager.FramebufferPath());
   EXPECT_FALSE(manager.ShaderReady());

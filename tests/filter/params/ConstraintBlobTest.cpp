@@ -47,15 +47,9 @@ TEST(ConstraintBlob, OneLineAndOnePolygonMatchHandWrittenBytes) {
 TEST(ConstraintBlob, KindsAndAngles) {
   // Stored line kinds 0..3 read as 1..4, any other as 1; the angle only for 3.
   for (std::uint32_t stored : {0u, 2u, 3u, 4u, 0xFFFFFFFFu}) {
-    const auto back = Decode(ByteBuilder()
-                                 .U32(ConstraintBlob::kLineTag)
-                                 .F32(0)
-                                 .F32(0)
-                                 .F32(1)
-                                 .F32(1)
-                                 .U32(stored)
-                                 .F32(12.5f)
-                                 .Get());
+    ByteBuilder line;
+    line.U32(ConstraintBlob::kLineTag).F32(0).F32(0).F32(1).F32(1).U32(stored).F32(12.5f);
+    const auto back = Decode(line.Get());
     EXPECT_EQ(std::get<BlobLine>(back.at(0)).kind, stored <= 3 ? std::int32_t(stored) + 1 : 1);
     EXPECT_EQ(std::get<BlobLine>(back.at(0)).angle, stored == 3 ? 12.5f : 0.0f);
   }
@@ -90,15 +84,9 @@ TEST(ConstraintBlob, DamageStopsTheWalkAndKeepsEarlierRecords) {
   std::vector<std::uint8_t> bytes(two.begin(), two.begin() + 28);
   EXPECT_EQ(Decode(ByteBuilder().Bytes(bytes).U32(0x12345678).Bytes(bytes).Get()).size(), 1u);
   for (std::uint32_t count : {2u, 0x15555556u, 0xFFFFFFFFu}) {  // more corners than bytes
-    const auto cut = ByteBuilder()
-                         .Bytes(bytes)
-                         .U32(ConstraintBlob::kPolygonTag)
-                         .U32(count)
-                         .F32(0)
-                         .F32(0)
-                         .U32(0)
-                         .Get();
-    EXPECT_EQ(Decode(cut).size(), 1u) << count;
+    ByteBuilder cut;
+    cut.Bytes(bytes).U32(ConstraintBlob::kPolygonTag).U32(count).F32(0).F32(0).U32(0);
+    EXPECT_EQ(Decode(cut.Get()).size(), 1u) << count;
   }
   EXPECT_TRUE(ConstraintBlob::Decode(nullptr, 10).empty());
 }

@@ -1,157 +1,74 @@
+// The filter's descriptor keys against the host program's descriptor suite.
+
 #include "filter/params/Descriptor.h"
 
 #include <gtest/gtest.h>
 
-#include <cstring>
 #include <limits>
-#include <memory>
 #include <vector>
+
+#include "host/plugin/Descriptor.h"
+#include "host/plugin/DescriptorSuite.h"
+#include "host/plugin/MemoryHandles.h"
 
 namespace Project {
 namespace {
 
 namespace Key = DescriptorKey;
 namespace Value = DescriptorValue;
+using Bytes = std::vector<std::uint8_t>;
+using Host::MemoryHandles;
 using Tarsa::HostDescriptor;
-using Tarsa::HostHandle;
 using Tarsa::HostStatus;
 
 constexpr std::int32_t kWidth = 3600;
-constexpr HostStatus kFailed = -1;
 
-// A stand-in for the host's descriptor service over a vector of entries. A
-// handle and a descriptor are both a FakeDescriptor; one made from a handle
-// remembers it, so that the test can count the readers freed. Leaks of
-// descriptors made for writing show in the sanitizer build.
-struct Entry {
-  std::uint32_t key;
-  char type;  // 'i' integer, 'f' float, 'e' enumerated, 'd' data
-  double number = 0;
-  std::uint32_t enumType = 0;
-  std::vector<std::uint8_t> data = {};
-};
+// The host's suite with `free` counted, so every reader can be seen freed.
+int freed = 0;
+const Tarsa::HostDescriptorSuite kSuite = [] {
+  Tarsa::HostDescriptorSuite suite = *Host::DescriptorSuite::Table();
+  suite.free = [](HostDescriptor d) {
+    ++freed;
+    return Host::DescriptorSuite::Table()->free(d);
+  };
+  return suite;
+}();
 
-struct FakeDescriptor {
-  std::vector<Entry> entries;
-  std::uint32_t failingKey = 0;  // every call on this key fails
-  bool failFromHandle = false;
-  bool failCount = false;
-  FakeDescriptor* madeFrom = nullptr;
-  int readersFreed = 0;
-};
-
-FakeDescriptor* Of(HostDescriptor d) { return reinterpret_cast<FakeDescriptor*>(d); }
-HostHandle HandleOf(FakeDescriptor& d) { return reinterpret_cast<HostHandle>(&d); }
-
-HostStatus Put(HostDescriptor d, Entry entry) {
-  if (entry.key == Of(d)->failingKey) return kFailed;
-  Of(d)->entries.push_back(std::move(entry));
-  return 0;
+// Reads descriptor through a handle, as the record's script block holds it.
+bool Read(const Host::Descriptor& descriptor, PSettings& s, Bytes& blob,
+          const Tarsa::HostDescriptorSuite* suite = &kSuite) {
+  const Tarsa::HostHandle handle = MemoryHandles::FromBytes(descriptor.ToBytes());
+  const bool read = ReadDescriptor(suite, handle, s, blob);
+  MemoryHandles::Dispose(handle);
+  return read;
 }
 
-const Entry* Find(HostDescriptor d, std::uint32_t key, char type) {
-  if (key == Of(d)->failingKey) return nullptr;
-  for (const Entry& e : Of(d)->entries) {
-    if (e.key == key) return e.type == type ? &e : nullptr;
-  }
-  return nullptr;
-}
-
-Tarsa::HostDescriptorSuite FakeSuite() {
-  Tarsa::HostDescriptorSuite s{};
-  s.make = [](HostDescriptor* d) -> HostStatus {
-    *d = reinterpret_cast<HostDescriptor>(new FakeDescriptor);
-    return 0;
-  };
-  s.free = [](HostDescriptor d) -> HostStatus {
-    if (Of(d)->madeFrom != nullptr) ++Of(d)->madeFrom->readersFreed;
-    delete Of(d);
-    return 0;
-  };
-  s.keyAt = [](HostDescriptor d, std::uint32_t i, std::uint32_t* key) -> HostStatus {
-    if (i >= Of(d)->entries.size()) return kFailed;
-    *key = Of(d)->entries[i].key;
-    return 0;
-  };
-  s.count = [](HostDescriptor d, std::uint32_t* n) -> HostStatus {
-    *n = static_cast<std::uint32_t>(Of(d)->entries.size());
-    return Of(d)->failCount ? kFailed : 0;
-  };
-  s.putInteger = [](HostDescriptor d, std::uint32_t k, std::int32_t v) {
-    return Put(d, {k, 'i', double(v)});
-  };
-  s.putFloat = [](HostDescriptor d, std::uint32_t k, double v) { return Put(d, {k, 'f', v}); };
-  s.putEnumerated = [](HostDescriptor d, std::uint32_t k, std::uint32_t t, std::uint32_t v) {
-    return Put(d, {k, 'e', double(v), t});
-  };
-  s.putData = [](HostDescriptor d, std::uint32_t k, std::int32_t n, const void* p) {
-    const auto* b = static_cast<const std::uint8_t*>(p);
-    return Put(d, {k, 'd', 0, 0, std::vector<std::uint8_t>(b, b + n)});
-  };
-  s.getInteger = [](HostDescriptor d, std::uint32_t k, std::int32_t* v) -> HostStatus {
-    const Entry* e = Find(d, k, 'i');
-    return e ? (*v = std::int32_t(e->number), 0) : kFailed;
-  };
-  s.getFloat = [](HostDescriptor d, std::uint32_t k, double* v) -> HostStatus {
-    const Entry* e = Find(d, k, 'f');
-    return e ? (*v = e->number, 0) : kFailed;
-  };
-  s.getEnumerated = [](HostDescriptor d, std::uint32_t k, std::uint32_t* t,
-                       std::uint32_t* v) -> HostStatus {
-    const Entry* e = Find(d, k, 'e');
-    return e ? (*t = e->enumType, *v = std::uint32_t(e->number), 0) : kFailed;
-  };
-  s.getDataLength = [](HostDescriptor d, std::uint32_t k, std::int32_t* n) -> HostStatus {
-    const Entry* e = Find(d, k, 'd');
-    return e ? (*n = std::int32_t(e->data.size()), 0) : kFailed;
-  };
-  s.getData = [](HostDescriptor d, std::uint32_t k, void* out) -> HostStatus {
-    const Entry* e = Find(d, k, 'd');
-    if (e == nullptr) return kFailed;
-    std::memcpy(out, e->data.data(), e->data.size());
-    return 0;
-  };
-  s.asHandle = [](HostDescriptor d, HostHandle* h) -> HostStatus {
-    *h = reinterpret_cast<HostHandle>(new FakeDescriptor{Of(d)->entries});
-    return 0;
-  };
-  s.fromHandle = [](HostHandle h, HostDescriptor* d) -> HostStatus {
-    auto* record = reinterpret_cast<FakeDescriptor*>(h);
-    if (record->failFromHandle) return kFailed;
-    *d = reinterpret_cast<HostDescriptor>(
-        new FakeDescriptor{record->entries, record->failingKey, false, record->failCount, record});
-    return 0;
-  };
-  return s;
-}
-
-const Tarsa::HostDescriptorSuite kSuite = FakeSuite();
-
-Entry Enum(std::uint32_t key, std::uint32_t value) { return {key, 'e', double(value), key}; }
-
-// Writes source and takes over the handle, as the host would.
-std::unique_ptr<FakeDescriptor> Write(const PSettings& source, std::vector<std::uint8_t> blob) {
-  return std::unique_ptr<FakeDescriptor>(
-      reinterpret_cast<FakeDescriptor*>(WriteDescriptor(&kSuite, source, blob)));
+// Writes source and takes over the handle.
+Host::Descriptor Write(const PSettings& source, const Bytes& blob) {
+  const Tarsa::HostHandle handle = WriteDescriptor(&kSuite, source, blob);
+  EXPECT_NE(handle, nullptr);
+  Host::Descriptor written = Host::Descriptor::FromBytes(MemoryHandles::Bytes(handle));
+  MemoryHandles::Dispose(handle);
+  return written;
 }
 
 TEST(Descriptor, ReadsEveryKeyAndIgnoresOthers) {
-  FakeDescriptor stored{{
-      {Key::kActionVersion, 'i', 7},
-      {Tarsa::FourCharCode("zzzz"), 'f', 1.0},
-      Enum(Key::kProjectionModel, Value::kPerspective),
-      Enum(Key::kRegularizerModel, Value::kPanini),
-      {Key::kFocalLength, 'f', 1234.56789012345},
-      {Key::kPhysicalFocal, 'f', 17.5},
-      {Key::kCropFactor, 'f', 1.6},
-      {Key::kImageScale, 'i', 80},
-      {Key::kImageCenterX, 'f', 0.4},
-      {Key::kImageCenterY, 'f', 1e300},
-      {Key::kConstraintData, 'd', 0, 0, {1, 2, 3}},
-  }};
+  Host::Descriptor stored;
+  stored.PutInteger(Key::kActionVersion, 7);
+  stored.PutFloat(Tarsa::FourCharCode("zzzz"), 1.0);
+  stored.PutEnumerated(Key::kProjectionModel, Key::kProjectionModel, Value::kPerspective);
+  stored.PutEnumerated(Key::kRegularizerModel, Key::kRegularizerModel, Value::kPanini);
+  stored.PutFloat(Key::kFocalLength, 1234.56789012345);
+  stored.PutFloat(Key::kPhysicalFocal, 17.5);
+  stored.PutFloat(Key::kCropFactor, 1.6);
+  stored.PutInteger(Key::kImageScale, 80);
+  stored.PutFloat(Key::kImageCenterX, 0.4);
+  stored.PutFloat(Key::kImageCenterY, 1e300);
+  stored.PutData(Key::kConstraintData, Bytes{1, 2, 3});
   PSettings s(kWidth);
-  std::vector<std::uint8_t> blob = {9, 9};
-  EXPECT_TRUE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
+  Bytes blob = {9, 9};
+  freed = 0;
+  EXPECT_TRUE(Read(stored, s, blob));
   EXPECT_EQ(s.projectionModel, PSettings::kModelPerspective);
   EXPECT_EQ(s.regularizerModel, PSettings::kRegularizerPanini);
   EXPECT_EQ(s.focalLength, static_cast<float>(1234.56789012345));
@@ -160,8 +77,8 @@ TEST(Descriptor, ReadsEveryKeyAndIgnoresOthers) {
   EXPECT_EQ(s.imageScale, 80);
   EXPECT_EQ(s.imageCenterX, static_cast<float>(0.4));
   EXPECT_EQ(s.imageCenterY, std::numeric_limits<float>::infinity());
-  EXPECT_EQ(blob, (std::vector<std::uint8_t>{1, 2, 3}));
-  EXPECT_EQ(stored.readersFreed, 1);
+  EXPECT_EQ(blob, (Bytes{1, 2, 3}));
+  EXPECT_EQ(freed, 1);
 }
 
 TEST(Descriptor, EnumerationsMapAsStored) {
@@ -180,11 +97,12 @@ TEST(Descriptor, EnumerationsMapAsStored) {
       {Key::kRegularizerModel, odd, 4},
   };
   for (const auto& c : cases) {
-    FakeDescriptor stored{{Enum(c.key, c.value)}};
+    Host::Descriptor stored;
+    stored.PutEnumerated(c.key, c.key, c.value);
     PSettings s(kWidth);
     s.projectionModel = s.regularizerModel = 0;
-    std::vector<std::uint8_t> blob;
-    ASSERT_TRUE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
+    Bytes blob;
+    ASSERT_TRUE(Read(stored, s, blob));
     EXPECT_EQ(c.key == Key::kProjectionModel ? s.projectionModel : s.regularizerModel, c.expected)
         << Tarsa::FourCharText(c.value);
   }
@@ -196,65 +114,68 @@ TEST(Descriptor, WritesKeysInOrderAndModelsAsStored) {
   s.regularizerModel = PSettings::kRegularizerMercator;
   s.focalLength = 1000.25f;
   s.imageScale = 150;
-  const auto written = Write(s, {5, 6});
-  ASSERT_NE(written, nullptr);
+  const Host::Descriptor written = Write(s, {5, 6});
   std::vector<std::uint32_t> keys;
-  for (const Entry& e : written->entries) keys.push_back(e.key);
+  for (const auto& item : written.Items()) keys.push_back(item.key);
   EXPECT_EQ(keys, (std::vector<std::uint32_t>{
                       Key::kActionVersion, Key::kConstraintData, Key::kProjectionModel,
                       Key::kRegularizerModel, Key::kFocalLength, Key::kPhysicalFocal,
                       Key::kCropFactor, Key::kImageScale, Key::kImageCenterX, Key::kImageCenterY}));
-  const auto& e = written->entries;
-  EXPECT_EQ(e[0].number, 0);
-  EXPECT_EQ(e[1].data, (std::vector<std::uint8_t>{5, 6}));
-  EXPECT_EQ(e[2].enumType, Key::kProjectionModel);
-  EXPECT_EQ(e[2].number, Value::kAutoProjection);
-  EXPECT_EQ(e[3].number, Value::kMercator);
-  EXPECT_EQ(e[4].number, 1000.25);
-  EXPECT_EQ(e[7].type, 'i');
-  EXPECT_EQ(e[7].number, 150);
+  EXPECT_EQ(written.Find(Key::kActionVersion)->integer, 0);
+  EXPECT_EQ(written.Find(Key::kConstraintData)->data, (Bytes{5, 6}));
+  EXPECT_EQ(written.Find(Key::kProjectionModel)->enumType, Key::kProjectionModel);
+  EXPECT_EQ(written.Find(Key::kProjectionModel)->enumValue, Value::kAutoProjection);
+  EXPECT_EQ(written.Find(Key::kRegularizerModel)->enumValue, Value::kMercator);
+  EXPECT_EQ(written.Find(Key::kFocalLength)->number, 1000.25);
+  EXPECT_EQ(written.Find(Key::kImageScale)->type, Host::Descriptor::Type::kInteger);
+  EXPECT_EQ(written.Find(Key::kImageScale)->integer, 150);
 
   // No constraints, no key; unknown models go out as Auto.
   s.projectionModel = 0;
   s.regularizerModel = 9;
-  const auto bare = Write(s, {});
-  ASSERT_EQ(bare->entries.size(), 9u);
-  EXPECT_EQ(bare->entries[1].number, Value::kAutoProjection);
-  EXPECT_EQ(bare->entries[2].number, Value::kAutoRegularizer);
+  const Host::Descriptor bare = Write(s, {});
+  EXPECT_EQ(bare.Count(), 9u);
+  EXPECT_EQ(bare.Find(Key::kConstraintData), nullptr);
+  EXPECT_EQ(bare.Find(Key::kProjectionModel)->enumValue, Value::kAutoProjection);
+  EXPECT_EQ(bare.Find(Key::kRegularizerModel)->enumValue, Value::kAutoRegularizer);
   s.projectionModel = PSettings::kModelFisheye;  // what a Panorama action replays as
-  EXPECT_EQ(Write(s, {})->entries[1].number, Value::kFisheye);
+  EXPECT_EQ(Write(s, {}).Find(Key::kProjectionModel)->enumValue, Value::kFisheye);
 }
 
 TEST(Descriptor, FailedCallsGiveFalseAndStillFreeTheReader) {
-  FakeDescriptor stored{{
-      {Key::kFocalLength, 'f', 50.0},
-      {Key::kCropFactor, 'i', 2},  // stored with the wrong type
-      {Key::kConstraintData, 'd', 0, 0, {1}},
-      {Key::kImageScale, 'i', 70},
-  }};
+  Host::Descriptor stored;
+  stored.PutFloat(Key::kFocalLength, 50.0);
+  stored.PutInteger(Key::kCropFactor, 2);  // stored with the wrong type
+  stored.PutData(Key::kConstraintData, Bytes{1});
+  stored.PutInteger(Key::kImageScale, 70);
   PSettings s(kWidth);
-  std::vector<std::uint8_t> blob;
-  EXPECT_FALSE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
+  Bytes blob;
+  freed = 0;
+  EXPECT_FALSE(Read(stored, s, blob));
   EXPECT_EQ(s.focalLength, 50.0f);  // what could be read still stands
   EXPECT_EQ(s.cropFactor, 1.0f);
   EXPECT_EQ(s.imageScale, 70);
-  stored.failingKey = Key::kConstraintData;
-  EXPECT_FALSE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
+  EXPECT_EQ(blob, Bytes{1});
+  stored.PutFloat(Key::kConstraintData, 1.0);  // replaced by the wrong type
+  EXPECT_FALSE(Read(stored, s, blob));
   EXPECT_TRUE(blob.empty());
-  stored.failCount = true;
-  EXPECT_FALSE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
-  EXPECT_EQ(stored.readersFreed, 3);
+  Tarsa::HostDescriptorSuite failing = kSuite;
+  failing.count = [](HostDescriptor, std::uint32_t*) -> HostStatus { return -1; };
+  EXPECT_FALSE(Read(stored, s, blob, &failing));
+  EXPECT_EQ(freed, 3);
 
-  stored.failFromHandle = true;
-  EXPECT_FALSE(ReadDescriptor(&kSuite, HandleOf(stored), s, blob));
+  // Bytes that are no descriptor; no handle; no suite; a table of nulls.
+  const Bytes junk = {1, 2, 3};
+  const Tarsa::HostHandle damaged = MemoryHandles::FromBytes(junk);
+  EXPECT_FALSE(ReadDescriptor(&kSuite, damaged, s, blob));
+  MemoryHandles::Dispose(damaged);
   EXPECT_FALSE(ReadDescriptor(&kSuite, nullptr, s, blob));
-  EXPECT_FALSE(ReadDescriptor(nullptr, HandleOf(stored), s, blob));
-  const Tarsa::HostDescriptorSuite empty{};  // a host table with no entries
-  EXPECT_FALSE(ReadDescriptor(&empty, HandleOf(stored), s, blob));
+  EXPECT_FALSE(Read(stored, s, blob, nullptr));
+  const Tarsa::HostDescriptorSuite empty{};
+  EXPECT_FALSE(Read(stored, s, blob, &empty));
   EXPECT_EQ(WriteDescriptor(&empty, s, {}), nullptr);
-  Tarsa::HostDescriptorSuite failingMake = kSuite;
-  failingMake.make = [](HostDescriptor*) -> HostStatus { return kFailed; };
-  EXPECT_EQ(WriteDescriptor(&failingMake, s, {}), nullptr);
+  failing.make = [](HostDescriptor*) -> HostStatus { return -1; };
+  EXPECT_EQ(WriteDescriptor(&failing, s, {}), nullptr);
 }
 
 }  // namespace

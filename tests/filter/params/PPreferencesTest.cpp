@@ -22,14 +22,9 @@ bool ReadBytes(PPreferences& prefs, const std::vector<std::uint8_t>& bytes) {
 
 // A file around the chunk list body.
 std::vector<std::uint8_t> File(const ByteBuilder& body, bool bigEndian = false) {
-  return ByteBuilder(bigEndian)
-      .Code("Trsa")
-      .Code("AXCo")
-      .U32(0)
-      .U32(0)
-      .U32(body.Size())
-      .Bytes(body.Get())
-      .Get();
+  ByteBuilder file(bigEndian);
+  file.Code("Trsa").Code("AXCo").U32(0).U32(0).U32(body.Size()).Bytes(body.Get());
+  return file.Get();
 }
 
 TEST(PPreferences, WritesTheFileByteForByte) {
@@ -126,20 +121,10 @@ TEST(PPreferences, RoundTripsThroughTheDirectory) {
 TEST(PPreferences, RefusedFilesLeaveTheDefaults) {
   const auto file = [](const char* magic, const char* kind, std::uint32_t high,
                        std::uint32_t length) {
-    return ByteBuilder()
-        .Code(magic)
-        .Code(kind)
-        .U32(0)
-        .U32(high)
-        .U32(length)
-        .Code("AXCo")
-        .Code("DFlg")
-        .U32(0)
-        .U32(0)
-        .U32(4)
-        .U32(77)
-        .U32(0)
-        .Get();
+    ByteBuilder bytes;
+    bytes.Code(magic).Code(kind).U32(0).U32(high).U32(length);
+    bytes.Code("AXCo").Code("DFlg").U32(0).U32(0).U32(4).U32(77).U32(0);
+    return bytes.Get();
   };
   std::vector<std::uint8_t> headerOnly = file("Trsa", "AXCo", 0, 28);
   headerOnly.resize(20);
@@ -174,14 +159,14 @@ TEST(PPreferences, MissingOrForeignFilesAndDirectoriesFailQuietly) {
   PPreferences prefs(kWidth);
   prefs.Load(scratch.Get());
   EXPECT_EQ(prefs.displayFlags, 3u);
-  const Tarsa::CDirectory gone = Tarsa::CDirectory::FromPath(scratch.Path() + "gone/");
+  const Tarsa::CDirectory gone = Tarsa::CDirectory::FromPath(scratch.Dir() + "gone/");
   EXPECT_NO_THROW(prefs.Save(gone));
   EXPECT_FALSE(gone.Exists());
 
   Tarsa::CDirectory dir;
   ASSERT_TRUE(GetPreferencesDirectory(scratch.Get(), dir));
   EXPECT_EQ(dir.GetPath(),
-            scratch.Path() + "Orvane/Orvane Quillmark VX 2099/Orvane Quillmark VX 2099 Settings/");
+            scratch.Dir() + "Orvane/Orvane Quillmark VX 2099/Orvane Quillmark VX 2099 Settings/");
   EXPECT_TRUE(dir.Exists());
   Testing::ScratchDirectory blocked;  // a file where the first level should be
   Tarsa::CFile(blocked.Get(), "Orvane", true);

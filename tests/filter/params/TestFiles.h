@@ -1,6 +1,5 @@
 #pragma once
 
-#include <chrono>
 #include <cstdint>
 #include <cstring>
 #include <string>
@@ -10,7 +9,7 @@
 #include <gtest/gtest.h>
 
 #include "framework/files/CDirectory.h"
-#include "framework/files/FilePaths.h"
+#include "tests/support/TestSupport.h"
 
 namespace Project::Testing {
 
@@ -54,31 +53,10 @@ class ByteBuilder {
   std::vector<std::uint8_t> bytes_;
 };
 
-// A fresh directory for one test, removed with its contents afterwards. The
-// name carries the test and a clock reading, so that the plain and sanitizer
-// programs running side by side never meet.
-class ScratchDirectory {
+// A scratch folder, as the framework names directories.
+class ScratchDirectory : public TestSupport::ScratchFolder {
  public:
-  ScratchDirectory() {
-    const auto* test = ::testing::UnitTest::GetInstance()->current_test_info();
-    directory_ = Tarsa::CDirectory(
-        Tarsa::GetTemporaryDirectoryPath() + "archway_params_" + test->name() + "_" +
-            std::to_string(std::chrono::steady_clock::now().time_since_epoch().count()),
-        true);
-  }
-  ~ScratchDirectory() {
-    try {
-      directory_.Delete();
-    } catch (...) {
-    }
-  }
-  ScratchDirectory(const ScratchDirectory&) = delete;
-  ScratchDirectory& operator=(const ScratchDirectory&) = delete;
-  const Tarsa::CDirectory& Get() const { return directory_; }
-  std::string Path() const { return directory_.GetPath(); }
-
- private:
-  Tarsa::CDirectory directory_;
+  Tarsa::CDirectory Get() const { return Tarsa::CDirectory(Dir()); }
 };
 
 }  // namespace Project::Testing

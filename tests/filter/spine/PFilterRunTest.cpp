@@ -11,7 +11,7 @@
 #include "framework/native/NativeDisplay.h"
 #include "framework/plugin/CFrameworkServices.h"
 #include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/plugin/RealHost.h"
 #include "tests/framework/process/RecordingPresenter.h"
 
 // The leak checker's suppressions for this program: Mesa's EGL keeps a
@@ -28,8 +28,6 @@ using Tarsa::FourCC;
 using Tarsa::ScopedRecorder;
 using Texts = std::vector<std::string>;
 
-constexpr std::intptr_t kHostVersion18 = std::intptr_t(18) << 16;
-
 class FilterRun : public ::testing::Test {
  protected:
   void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
@@ -38,12 +36,12 @@ class FilterRun : public ::testing::Test {
   std::int16_t Call(std::int16_t selector) {
     std::int16_t result = 77;
     std::intptr_t slot = 0;
-    EntryFI(selector, &host.record, &slot, &result);
+    EntryFI(selector, host.Record(), &slot, &result);
     return result;
   }
 
   ScopedConfigHome config;
-  Tarsa::testing::TestHost host;
+  Tarsa::testing::RealHost host;
 };
 
 TEST_F(FilterRun, EntryAnswersOutsideTheTableAndWithoutAnObject) {
@@ -56,7 +54,7 @@ TEST_F(FilterRun, EntryAnswersOutsideTheTableAndWithoutAnObject) {
 
   EXPECT_EQ(Call(Tarsa::kSelectorParameters), 0);
   ASSERT_NE(PFilter::Current(), nullptr);
-  EXPECT_EQ(host.coords.enabled, 1u) << "parameters switches on 32-bit coordinates";
+  EXPECT_EQ(host.Coords().enabled, 1u) << "parameters switches on 32-bit coordinates";
   EXPECT_EQ(Call(Tarsa::kSelectorFinish), 0);
   EXPECT_EQ(PFilter::Current(), nullptr);
 }
@@ -81,28 +79,26 @@ TEST_F(FilterRun, MemoryOfferIsSplitEightyTwenty) {
     {
       TestPFilter filter;
       filter.SetUseBufferSuite(false);
-      host.record.memoryOffer = c.total;
-      ASSERT_EQ(filter.HandlePrepare(&host.record, nullptr), 0);
-      EXPECT_EQ(host.record.memoryOffer, c.first + c.second);
-      EXPECT_EQ(host.record.bufferShare, c.first);
+      host.Record()->memoryOffer = c.total;
+      ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
+      EXPECT_EQ(host.Record()->memoryOffer, c.first + c.second);
+      EXPECT_EQ(host.Record()->bufferShare, c.first);
     }
     Tarsa::CPluginEntry::TearDown();
     // With it (the default), the filter's share comes from the host's
     // buffers and the host keeps the second part.
-    host.record.memoryOffer = c.total;
+    host.Record()->memoryOffer = c.total;
     ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
-    EXPECT_EQ(host.record.memoryOffer, c.second);
-    EXPECT_EQ(host.record.bufferShare, 0u);
+    EXPECT_EQ(host.Record()->memoryOffer, c.second);
+    EXPECT_EQ(host.Record()->bufferShare, 0u);
     Call(Tarsa::kSelectorFinish);
   }
 }
 
 TEST_F(FilterRun, WrongHostVersionIsRefusedBeforeAnythingIsTouched) {
-  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
-  host.properties[FourCC("GPUF")] = 0x80;
   for (std::intptr_t version :
        {std::intptr_t(17) << 16, std::intptr_t(19) << 16, std::intptr_t(18)}) {
-    host.properties[FourCC("vers")] = version;
+    host.Properties().Override(FourCC("vers"), version);
     ScopedRecorder shown;
     ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
     EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
@@ -112,7 +108,7 @@ TEST_F(FilterRun, WrongHostVersionIsRefusedBeforeAnythingIsTouched) {
     EXPECT_EQ(PFilter::Current(), nullptr) << "a refused start tears the object down";
   }
   // A host that does not say its version is refused the same way.
-  host.properties.erase(FourCC("vers"));
+  host.Properties().Withhold(FourCC("vers"));
   ScopedRecorder shown;
   EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
   EXPECT_EQ(shown.texts.size(), 1u);
@@ -121,9 +117,7 @@ TEST_F(FilterRun, WrongHostVersionIsRefusedBeforeAnythingIsTouched) {
 }
 
 TEST_F(FilterRun, GraphicsProcessorSwitchedOffIsRefused) {
-  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
-  host.properties[FourCC("vers")] = kHostVersion18;
-  host.properties[FourCC("GPUF")] = 0x7F;  // every bit but 7
+  host.Properties().Override(FourCC("GPUF"), 0x7F);  // every bit but 7
   ScopedRecorder shown;
   EXPECT_EQ(Call(Tarsa::kSelectorStart), 1);
   EXPECT_EQ(shown.titles, Texts{"Archway Error"});
@@ -136,7 +130,6 @@ TEST_F(FilterRun, GraphicsProcessorSwitchedOffIsRefused) {
 }
 
 TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
-  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
   {
     PPreferences saved(64);
     saved.settings.physicalFocal = 42;
@@ -148,7 +141,7 @@ TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
   const std::uint32_t shift = Tarsa::Native::kModifierShift;
   for (std::uint32_t held : {ctrl | alt | shift, ctrl | alt, 0u}) {
     TestPFilter filter;
-    ASSERT_EQ(filter.HandleParameters(&host.record, nullptr), 0);
+    ASSERT_EQ(filter.HandleParameters(host.Record(), nullptr), 0);
     filter.heldKeys = held;
     const bool all = held == (ctrl | alt | shift);
     EXPECT_EQ(filter.Preferences().settings.physicalFocal, all ? 15.0f : 42.0f) << held;
@@ -160,9 +153,6 @@ TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
 // which throws. Needs a working OpenGL environment (a GPU or Mesa's software
 // renderer); without one the run is refused at the OpenGL check instead.
 TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
-  host.MakeDocument(Tarsa::kHostModeRGB, 64, 32, false);
-  host.properties[FourCC("vers")] = kHostVersion18;
-  host.properties[FourCC("GPUF")] = 0x80;
   static int prepared = 0;
   prepared = 0;
   const Tarsa::HostLensProfilesSuite lens{nullptr, nullptr, [] {
@@ -170,7 +160,7 @@ TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
                                             return Tarsa::HostStatus(0);
                                           }};
   host.AddSuite(Tarsa::kLensProfilesSuite, 2, &lens);
-  host.record.flagByte94 = 5;
+  host.Record()->flagByte94 = 5;
   ScopedRecorder shown;
   ASSERT_EQ(Call(Tarsa::kSelectorParameters), 0);
   ASSERT_EQ(Call(Tarsa::kSelectorPrepare), 0);
@@ -182,7 +172,7 @@ TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
   }
   EXPECT_EQ(shown.texts[0], "This build of Archway cannot solve corrections yet.");
   EXPECT_EQ(host.propertyWrites.front(), std::make_pair(FourCC("wtch"), std::intptr_t(1)));
-  EXPECT_EQ(host.record.flagByte94, 0);
+  EXPECT_EQ(host.Record()->flagByte94, 0);
   // Auto was forced, so the lens profiles were asked: the suite was taken,
   // prepared once, and let go by the clean-up.
   EXPECT_EQ(prepared, 1);

@@ -1,6 +1,7 @@
 // How the projection model and the focal length follow from the image, the
 // metadata and the lens profiles.
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -8,7 +9,7 @@
 
 #include "filter/PFilter.h"
 #include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/plugin/RealHost.h"
 #include "tests/framework/process/RecordingPresenter.h"
 
 namespace Project::testing {
@@ -31,18 +32,17 @@ class ProjectionModel : public ::testing::Test {
   }
   // A filter serving an image of width x height.
   TestPFilter& Make(std::int32_t width, std::int32_t height) {
-    host.record.imageMode = Tarsa::kHostModeRGB;
-    host.coords.imageWidth = width;
-    host.coords.imageHeight = height;
-    host.coords.enabled = 1;
+    host.Coords().imageWidth = width;
+    host.Coords().imageHeight = height;
+    host.Coords().enabled = 1;
     filter.reset();  // one process at a time
     filter = std::make_unique<TestPFilter>();
-    EXPECT_EQ(filter->HandleParameters(&host.record, nullptr), 0);
+    EXPECT_EQ(filter->HandleParameters(host.Record(), nullptr), 0);
     return *filter;
   }
   std::int32_t Model() { return filter->Settings().projectionModel; }
 
-  Tarsa::testing::TestHost host;
+  Tarsa::testing::RealHost host;
   std::unique_ptr<TestPFilter> filter;
 };
 
@@ -121,8 +121,13 @@ TEST_F(ProjectionModel, ForcedAutoDecidesBySixteenMillimetresEquivalent) {
 TEST_F(ProjectionModel, LensMatchWithoutTheHostsSuiteFindsNothing) {
   TestPFilter& f = Make(400, 300);
   f.realLensMatch = true;
+  const std::string lensKey = std::string(Tarsa::kLensProfilesSuite) + "#2";
+  const auto lensCount = [&lensKey](const std::vector<std::string>& log) {
+    return std::count(log.begin(), log.end(), lensKey);
+  };
+  host.AddSuite(Tarsa::kLensProfilesSuite, 2, nullptr);  // a host without the service
   EXPECT_FALSE(f.MatchLensProfile(false));
-  EXPECT_TRUE(host.acquired.empty());
+  EXPECT_EQ(lensCount(host.acquired), 0);
 
   // With the suite: taken and prepared once, kept for the run.
   static int prepared = 0;
@@ -132,12 +137,12 @@ TEST_F(ProjectionModel, LensMatchWithoutTheHostsSuiteFindsNothing) {
                                             return Tarsa::HostStatus(0);
                                           }};
   host.AddSuite(Tarsa::kLensProfilesSuite, 2, &lens);
-  EXPECT_FALSE(f.MatchLensProfile(false)) << "choosing among profiles is not in this build";
+  EXPECT_FALSE(f.MatchLensProfile(false)) << "a service without a query answers nothing";
   EXPECT_FALSE(f.MatchLensProfile(false));
   EXPECT_EQ(prepared, 1);
-  EXPECT_EQ(host.acquired.size(), 1u);
+  EXPECT_EQ(lensCount(host.acquired), 1);
   filter.reset();
-  EXPECT_EQ(host.released.size(), 1u);
+  EXPECT_EQ(lensCount(host.released), 1);
 }
 
 TEST_F(ProjectionModel, FocalLengthFromMetadataInMillimetresAndPixels) {

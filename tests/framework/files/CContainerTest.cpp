@@ -55,9 +55,9 @@ TEST(CContainer, ReadsStopAtTheEndInMemoryAndInFiles) {
   memory.Write(Bytes{1, 2, 3, 4}.data(), 4);
   ExpectReadsStopAtTheEnd(memory);
 
-  testing::TempFolder folder;
-  folder.WriteBytes("four.bin", {1, 2, 3, 4});
-  CFileContainer file(CFile(folder.Path("four.bin")));
+  testing::ScratchFolder folder;
+  folder.Put("four.bin", {1, 2, 3, 4});
+  CFileContainer file(CFile(folder.File("four.bin")));
   ExpectReadsStopAtTheEnd(file);
 }
 
@@ -130,32 +130,32 @@ TEST(CBlockContainer, WritesIntoAnOutsideBlockOrMovesAloneWithNone) {
 }
 
 TEST(CFileContainer, WriteAtPastTheEndExtendsTheFileFirst) {
-  testing::TempFolder folder;
-  folder.WriteBytes("f.bin", {'a', 'b', 'c'});
+  testing::ScratchFolder folder;
+  folder.Put("f.bin", {'a', 'b', 'c'});
   {
-    CFileContainer c(CFile(folder.Path("f.bin")), CFilePort::kMode_ReadWrite);
+    CFileContainer c(CFile(folder.File("f.bin")), CFilePort::kMode_ReadWrite);
     c.WriteAt("XY", 2, 6);
     EXPECT_EQ(c.Size(), 8u);
     EXPECT_EQ(c.Position(), 8u);
     c.SetSize(7);  // cuts the file, position follows
     EXPECT_EQ(c.Position(), 7u);
   }
-  EXPECT_EQ(folder.ReadBytes("f.bin"), (Bytes{'a', 'b', 'c', 0, 0, 0, 'X'}));
+  EXPECT_EQ(folder.Get("f.bin"), (Bytes{'a', 'b', 'c', 0, 0, 0, 'X'}));
 }
 
 TEST(CFileContainer, MissingFilesAreNeverMadeAndReadModeRefusesWrites) {
-  testing::TempFolder folder;
-  const std::string missing = folder.Path("missing.bin");
+  testing::ScratchFolder folder;
+  const std::string missing = folder.File("missing.bin");
   for (int mode : {CFilePort::kMode_Read, CFilePort::kMode_ReadWrite}) {
     EXPECT_EQ(SystemCode([&] { CFileContainer c(CFile::FromPath(missing), mode); }), ENOENT);
     EXPECT_FALSE(std::filesystem::exists(missing));
   }
   EXPECT_EQ(SystemCode([&] { CFileContainer c(CFile::FromPath(folder.Dir())); }), EISDIR);
 
-  folder.WriteBytes("ro.bin", {1, 2});
-  CFileContainer c(CFile(folder.Path("ro.bin")), CFilePort::kMode_Read);
+  folder.Put("ro.bin", {1, 2});
+  CFileContainer c(CFile(folder.File("ro.bin")), CFilePort::kMode_Read);
   EXPECT_EQ(SystemCode([&] { c.WriteByte(9); }), EBADF);
-  EXPECT_EQ(folder.ReadBytes("ro.bin"), (Bytes{1, 2}));
+  EXPECT_EQ(folder.Get("ro.bin"), (Bytes{1, 2}));
 }
 
 }  // namespace

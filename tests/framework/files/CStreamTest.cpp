@@ -82,36 +82,30 @@ void Fill(CMemoryContainer& c, const Bytes& bytes) {
   c.SetPosition(0);
 }
 
-TEST(CStream, TypedValuesRoundTripInBothOrdersInMemory) {
+TEST(CStream, TypedValuesRoundTripInBothOrdersInMemoryAndInFiles) {
+  testing::ScratchFolder folder;
   for (bool swap : {false, true}) {
     SCOPED_TRACE(swap ? "swapped" : "machine order");
-    CMemoryContainer c;
-    c.SetSwapBytes(swap);
-    WriteSample(c);
-    EXPECT_EQ(Bytes(c.Data(), c.Data() + c.Size()), ExpectedLayout(swap));
-    c.SetPosition(0);
-    ExpectSample(c);
-    EXPECT_EQ(c.Position(), c.Size());
-  }
-}
+    CMemoryContainer memory;
+    memory.SetSwapBytes(swap);
+    WriteSample(memory);
+    EXPECT_EQ(Bytes(memory.Data(), memory.Data() + memory.Size()), ExpectedLayout(swap));
+    memory.SetPosition(0);
+    ExpectSample(memory);
+    EXPECT_EQ(memory.Position(), memory.Size());
 
-TEST(CStream, TypedValuesRoundTripInBothOrdersInFiles) {
-  testing::TempFolder folder;
-  const CDirectory dir(folder.Dir());
-  for (bool swap : {false, true}) {
-    SCOPED_TRACE(swap ? "swapped" : "machine order");
-    const CFile file(dir, swap ? "swapped.bin" : "plain.bin", true);
+    const CFile file(CDirectory(folder.Dir()), "sample.bin", true);
     {
       CFileContainer out(file, CFilePort::kMode_ReadWrite);
       out.SetSwapBytes(swap);
       WriteSample(out);
       out.Flush();
     }
-    EXPECT_EQ(folder.ReadBytes(file.GetName()), ExpectedLayout(swap));
+    EXPECT_EQ(folder.Get("sample.bin"), ExpectedLayout(swap));
     CFileContainer in(file);
-    EXPECT_EQ(in.Size(), kBigEndian.size());
     in.SetSwapBytes(swap);
     ExpectSample(in);
+    EXPECT_EQ(in.Position(), kBigEndian.size());
   }
 }
 

@@ -2,13 +2,12 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-#include <optional>
 #include <string>
 
 #include "framework/core/CException.h"
 #include "framework/files/CDirectory.h"
 #include "framework/files/CFile.h"
+#include "tests/support/TestSupport.h"
 
 namespace Tarsa {
 namespace {
@@ -104,29 +103,7 @@ TEST(FilePaths, ParentsClimbToTheRoot) {
   }
 }
 
-// Sets an environment variable for one scope and puts the old value back.
-class EnvironmentGuard {
- public:
-  EnvironmentGuard(const char* name, const char* value) : name_(name) {
-    if (const char* old = std::getenv(name)) old_ = old;
-    if (value != nullptr) {
-      setenv(name, value, 1);
-    } else {
-      unsetenv(name);
-    }
-  }
-  ~EnvironmentGuard() {
-    if (old_) {
-      setenv(name_, old_->c_str(), 1);
-    } else {
-      unsetenv(name_);
-    }
-  }
-
- private:
-  const char* name_;
-  std::optional<std::string> old_;
-};
+using EnvironmentGuard = TestSupport::ScopedEnvironment;
 
 TEST(FilePaths, FoldersFollowTheEnvironmentAndItsDefaults) {
   EnvironmentGuard home("HOME", "/h/me");

@@ -10,7 +10,7 @@
 #include "framework/plugin/CQuillmarkError.h"
 #include "framework/strings/CStringTable.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/plugin/RealHost.h"
 #include "tests/framework/process/RecordingPresenter.h"
 
 namespace Tarsa::testing {
@@ -30,83 +30,73 @@ class PluginEntry : public ::testing::Test {
   static int Made() { return ProbeFilter::Plan().made; }
   static int Destroyed() { return ProbeFilter::Plan().destroyed; }
 
-  TestHost host;
+  RealHost host;
 };
 
-TEST_F(PluginEntry, SelectorsOutsideTheTableAnswerZeroAndTouchNothing) {
-  for (std::int16_t selector :
-       {std::int16_t(-1), std::int16_t(-32768), std::int16_t(6), std::int16_t(300)}) {
-    EXPECT_EQ(ProbeFilter::Call(selector, &host.record), 0) << selector;
+TEST_F(PluginEntry, SelectorsOutsideTheTableOrWithoutAnObjectAnswerZero) {
+  for (std::int16_t selector : {std::int16_t(-1), std::int16_t(-32768), std::int16_t(6),
+                                std::int16_t(300), std::int16_t(kSelectorContinue)}) {
+    EXPECT_EQ(ProbeFilter::Call(selector, host.Record()), 0) << selector;
   }
   EXPECT_EQ(Made(), 0);
   EXPECT_FALSE(CFrameworkServices::IsStarted());
-
-  // With an object alive they leave it as it is.
-  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
-  EXPECT_EQ(ProbeFilter::Call(9, &host.record), 0);
-  EXPECT_TRUE(Exists());
-  EXPECT_EQ(Destroyed(), 0);
-}
-
-TEST_F(PluginEntry, ContinueAndFinishWithoutAnObjectAnswerZero) {
-  EXPECT_EQ(ProbeFilter::Call(kSelectorContinue, &host.record), 0);
-  EXPECT_EQ(Made(), 0);
   CFrameworkServices::Start();
   EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, nullptr), 0);
   EXPECT_EQ(Made(), 0);
   EXPECT_FALSE(CFrameworkServices::IsStarted()) << "finish shuts the framework down regardless";
+
+  // With an object alive they leave it as it is.
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, host.Record()), 0);
+  EXPECT_EQ(ProbeFilter::Call(9, host.Record()), 0);
+  EXPECT_TRUE(Exists());
+  EXPECT_EQ(Destroyed(), 0);
 }
 
-TEST_F(PluginEntry, InteractiveRunKeepsOneObjectFromParametersToFinish) {
-  host.record.memoryOffer = 1 << 20;
-  EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
-  ASSERT_TRUE(Exists());
-  EXPECT_TRUE(CFrameworkServices::IsMainThread());
-  EXPECT_TRUE(CQuillmarkFilter::Current()->IsInteractive());
-  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 0);
-  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 0);
-  EXPECT_TRUE(CQuillmarkFilter::Current()->IsInteractive()) << "same object as parameters";
-  ProbeFilter::Plan().proceed = false;
-  EXPECT_EQ(ProbeFilter::Call(kSelectorContinue, &host.record), 1);
-  EXPECT_TRUE(Exists()) << "continue keeps the object whatever it answers";
-  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
-  EXPECT_FALSE(Exists());
-  EXPECT_EQ(Made(), 1);
-  EXPECT_EQ(Destroyed(), 1);
-  EXPECT_EQ(ProbeFilter::Plan().finished, 1);
-  EXPECT_FALSE(CFrameworkServices::IsStarted());
+TEST_F(PluginEntry, ARunKeepsOneObjectFromItsFirstSelectorToFinish) {
+  // Interactive: from parameters; scripted: from prepare, not interactive.
+  for (const bool interactive : {true, false}) {
+    SCOPED_TRACE(interactive ? "interactive" : "scripted");
+    ProbeFilter::Plan() = ProbeFilter::Script{};
+    if (interactive) {
+      EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, host.Record()), 0);
+    }
+    EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, host.Record()), 0);
+    ASSERT_TRUE(Exists());
+    EXPECT_TRUE(CFrameworkServices::IsMainThread());
+    EXPECT_EQ(CQuillmarkFilter::Current()->IsInteractive(), interactive);
+    EXPECT_EQ(ProbeFilter::Call(kSelectorStart, host.Record()), 0);
+    ProbeFilter::Plan().proceed = false;
+    EXPECT_EQ(ProbeFilter::Call(kSelectorContinue, host.Record()), 1);
+    EXPECT_TRUE(Exists()) << "continue keeps the object whatever it answers";
+    EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, host.Record()), 0);
+    EXPECT_FALSE(Exists());
+    EXPECT_EQ(Made(), 1);
+    EXPECT_EQ(Destroyed(), 1);
+    EXPECT_EQ(ProbeFilter::Plan().finished, 1);
+    EXPECT_FALSE(CFrameworkServices::IsStarted());
+  }
 }
 
-TEST_F(PluginEntry, ScriptedRunBeginsAtPrepareWithAFreshNonInteractiveObject) {
-  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 0);
-  ASSERT_TRUE(Exists());
-  EXPECT_FALSE(CQuillmarkFilter::Current()->IsInteractive());
-  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 0);
-  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
-  EXPECT_EQ(Made(), 1);
-  EXPECT_EQ(Destroyed(), 1);
-}
-
-TEST_F(PluginEntry, AFailingAnswerTearsTheObjectDown) {
+TEST_F(PluginEntry, AFailingAnswerOrAboutTearsTheObjectDown) {
   ProbeFilter::Plan().parameters = false;
-  EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 1);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorParameters, host.Record()), 1);
   EXPECT_FALSE(Exists());
   ProbeFilter::Plan().prepare = false;
-  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, &host.record), 1);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorPrepare, host.Record()), 1);
   EXPECT_FALSE(Exists());
   ProbeFilter::Plan().start = false;  // a cancelled run answers 1
-  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), 1);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorStart, host.Record()), 1);
   EXPECT_FALSE(Exists());
   EXPECT_EQ(Made(), 3);
   EXPECT_EQ(Destroyed(), 3);
-}
 
-TEST_F(PluginEntry, AboutMakesItsOwnObjectAndNeverKeepsIt) {
-  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
-  EXPECT_EQ(ProbeFilter::Call(kSelectorAbout, &host.record), 0);
+  // About makes its own object and never keeps it, nor the one before.
+  ProbeFilter::Plan().parameters = true;
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, host.Record()), 0);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorAbout, host.Record()), 0);
   EXPECT_FALSE(Exists());
-  EXPECT_EQ(Made(), 2);
-  EXPECT_EQ(Destroyed(), 2);
+  EXPECT_EQ(Made(), 5);
+  EXPECT_EQ(Destroyed(), 5);
 }
 
 TEST_F(PluginEntry, ThrownFailuresBecomeTheAnswerAndTearDown) {
@@ -130,7 +120,7 @@ TEST_F(PluginEntry, ThrownFailuresBecomeTheAnswerAndTearDown) {
   for (const Case& c : cases) {
     ScopedRecorder shown;
     ProbeFilter::Plan().onStart = c.thrower;
-    EXPECT_EQ(ProbeFilter::Call(kSelectorStart, &host.record), c.answer);
+    EXPECT_EQ(ProbeFilter::Call(kSelectorStart, host.Record()), c.answer);
     EXPECT_EQ(shown.texts, c.shown);
     EXPECT_EQ(shown.beeps, 0);
     EXPECT_FALSE(Exists());
@@ -139,9 +129,9 @@ TEST_F(PluginEntry, ThrownFailuresBecomeTheAnswerAndTearDown) {
 }
 
 TEST_F(PluginEntry, ShutdownDropsTheStringTable) {
-  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, &host.record), 0);
+  ASSERT_EQ(ProbeFilter::Call(kSelectorParameters, host.Record()), 0);
   EXPECT_NE(CStringTable::Get(false), nullptr);
-  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, &host.record), 0);
+  EXPECT_EQ(ProbeFilter::Call(kSelectorFinish, host.Record()), 0);
   EXPECT_EQ(CStringTable::Get(false), nullptr);
 }
 

@@ -17,7 +17,7 @@
 #include "framework/process/CReporter.h"
 #include "framework/strings/CStringTable.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/plugin/RealHost.h"
 
 namespace Tarsa::testing {
 namespace {
@@ -36,20 +36,19 @@ class FilterRecord : public ::testing::Test {
     CPluginEntry::TearDown();
   }
   // A filter selector: from here on the record is the filter's.
-  void Enter() { ASSERT_EQ(filter->HandleParameters(&host.record, nullptr), 0); }
+  void Enter() { ASSERT_EQ(filter->HandleParameters(host.Record(), nullptr), 0); }
 
-  TestHost host;
+  RealHost host;
   std::unique_ptr<ProbeFilter> filter;
 };
 
 TEST_F(FilterRecord, WithoutAFilterRecordEveryAccessorAnswersEmpty) {
-  host.MakeDocument(kHostModeRGB, 30, 20, true);
-  host.properties[FourCC("TSiz")] = 512;
-  host.complexProperties[FourCC("unnm")] = std::string("a\0b\0", 4);
+  host.MakeDocument(Host::ImageMode::kRgb, 30, 20, true);
+  host.Properties().Override(FourCC("TSiz"), 512);
   // About hands over a record, but it is no filter record.
-  ASSERT_EQ(filter->HandleAbout(&host.record, nullptr), 0);
+  ASSERT_EQ(filter->HandleAbout(host.Record(), nullptr), 0);
   EXPECT_EQ(filter->FilterRecord(), nullptr);
-  EXPECT_EQ(filter->HostRecord(), &host.record);
+  EXPECT_EQ(filter->HostRecord(), host.Record());
   EXPECT_EQ(filter->ImageRect(), CRect{});
   EXPECT_EQ(filter->FilterRect(), CRect{});
   EXPECT_EQ(filter->TileOffset(), CPoint{});
@@ -59,7 +58,7 @@ TEST_F(FilterRecord, WithoutAFilterRecordEveryAccessorAnswersEmpty) {
   EXPECT_EQ(filter->ResolutionX(), 0.0);
   EXPECT_TRUE(filter->DocumentTitle().IsEmpty());
   filter->Use32BitCoordinates(true);
-  EXPECT_EQ(host.coords.enabled, 0u);
+  EXPECT_EQ(host.Coords().enabled, 0u);
 
   CMemoryPixmap pixmap(CRect{0, 0, 4, 4}, 2, 8);
   pixmap.Fill(0, pixmap.Bounds(), 9);
@@ -72,91 +71,73 @@ TEST_F(FilterRecord, WithoutAFilterRecordEveryAccessorAnswersEmpty) {
 }
 
 TEST_F(FilterRecord, ThirtyTwoBitBlockIsTheOnlySourceOnceEnabled) {
-  host.MakeDocument(kHostModeRGB, 40000, 3, false, /*use32=*/true);
+  host.MakeDocument(Host::ImageMode::kRgb, 40000, 3, false);
+  host.Record()->imageWidth16 = host.Record()->imageHeight16 = -7;  // nonsense, never read
+  host.Record()->filterRect16 = HostRect16{-7, -7, -7, -7};
   Enter();
+  filter->Use32BitCoordinates(true);
   EXPECT_EQ(filter->ImageSize(), (CSize{40000, 3}));
   EXPECT_EQ(filter->FilterRect(), (CRect{0, 0, 40000, 3}));
   EXPECT_EQ(filter->ImageRect(), (CRect{0, 0, 40000, 3}));
   // Disabled, the block is ignored entirely: the 16-bit fields (nonsense
   // here) are read, never a mix of both.
   filter->Use32BitCoordinates(false);
-  EXPECT_EQ(host.coords.enabled, 0u);
+  EXPECT_EQ(host.Coords().enabled, 0u);
   EXPECT_EQ(filter->ImageSize(), (CSize{-7, -7}));
   EXPECT_EQ(filter->FilterRect(), (CRect{-7, -7, -7, -7}));
   // An old host without the block: the switch does nothing.
-  host.record.coordinates32 = nullptr;
+  host.Record()->coordinates32 = nullptr;
   filter->Use32BitCoordinates(true);
   EXPECT_EQ(filter->ImageSize(), (CSize{-7, -7}));
-}
-
-TEST_F(FilterRecord, FloatingSelectionMovesTheImageRectangle) {
-  host.MakeDocument(kHostModeGray, 10, 8, false);
-  host.record.floatsOverImage = 1;
-  host.record.floatOrigin16 = HostPoint16{3, 5};  // y, x
-  host.record.wholeSize16 = HostPoint16{20, 30};  // height, width
-  Enter();
-  EXPECT_EQ(filter->ImageRect(), (CRect{-5, -3, 25, 17}));
-  EXPECT_EQ(filter->TileOffset(), (CPoint{5, 3}));
-  EXPECT_EQ(filter->LayerRect(), (CRect{0, 0, 10, 8}));
-
-  // Not floating: the image is at the origin, and the channels are offset by
-  // the float origin less the filtered area's corner.
-  host.record.floatsOverImage = 0;
-  host.record.floatOrigin16 = HostPoint16{0, 0};
-  host.record.filterRect16 = HostRect16{1, 2, 8, 10};
-  EXPECT_EQ(filter->ImageRect(), (CRect{0, 0, 10, 8}));
-  EXPECT_EQ(filter->TileOffset(), (CPoint{-2, -1}));
 }
 
 TEST_F(FilterRecord, HostPropertiesAndTheirDefaults) {
   Enter();
   EXPECT_TRUE(filter->TooltipsOn());
-  EXPECT_EQ(filter->HostTileSize(), 16384);
-  host.properties[FourCC("tltp")] = 0;
-  host.properties[FourCC("TSiz")] = 1024;
+  EXPECT_EQ(filter->HostTileSize(), Host::HostProperties::kTileSize);
+  host.Properties().Override(FourCC("tltp"), 0);
+  host.Properties().Withhold(FourCC("TSiz"));
   EXPECT_FALSE(filter->TooltipsOn());
-  EXPECT_EQ(filter->HostTileSize(), 1024);
+  EXPECT_EQ(filter->HostTileSize(), 16384);
 
-  host.properties[FourCC("UIBR")] = 7;  // out of range: the default
-  host.properties[FourCC("HLCR")] = 2;
-  host.properties[FourCC("LGTB")] = 1;
-  host.properties[FourCC("HDPI")] = 1;
-  filter->ReadDisplayProperties(&host.record);
+  host.Properties().Override(FourCC("UIBR"), 7);  // out of range: the default
+  host.Properties().Override(FourCC("HLCR"), 2);
+  host.Properties().Override(FourCC("LGTB"), 1);
+  host.Properties().Override(FourCC("HDPI"), 1);
+  filter->ReadDisplayProperties(host.Record());
   EXPECT_EQ(filter->UIBrightness(), 2);
   EXPECT_TRUE(filter->UIFlagHLCR());
   EXPECT_TRUE(filter->UIFlagLGTB());
   EXPECT_EQ(filter->DisplayScale(), 1);
-  host.properties[FourCC("UIBR")] = 0;
-  host.properties[FourCC("HLCR")] = 1;
-  filter->ReadDisplayProperties(&host.record);
+  host.Properties().Override(FourCC("UIBR"), 0);
+  host.Properties().Override(FourCC("HLCR"), 1);
+  filter->ReadDisplayProperties(host.Record());
   EXPECT_EQ(filter->UIBrightness(), 0);
   EXPECT_FALSE(filter->UIFlagHLCR());
 
   filter->SuspendWatchCursor(true);
-  ASSERT_EQ(host.propertyWrites.size(), 1u);
-  EXPECT_EQ(host.propertyWrites[0], std::make_pair(FourCC("wtch"), std::intptr_t(1)));
-
+  EXPECT_TRUE(host.Properties().WatchSuspended());
   // A table that counts fewer entries than needed is not called.
   host.propertyProcs.header.count = 0;
+  host.Properties().Override(FourCC("TSiz"), 1024);
   EXPECT_EQ(filter->HostTileSize(), 16384);
   filter->SuspendWatchCursor(false);
   EXPECT_EQ(host.propertyWrites.size(), 1u);
 }
 
 TEST_F(FilterRecord, TitleAndScratchVolumesComeFromHandlesThatAreDisposed) {
+  host.settings.properties.scratchVolumes = {"/scratch/a", "/b"};
+  host.MakeDocument(Host::ImageMode::kRgb, 4, 4, false);
   Enter();
   const char16_t title[] = u"\u015Ctreet.tif";  // with its trailing zero
-  host.complexProperties[FourCC("unnm")] =
-      std::string(reinterpret_cast<const char*>(title), sizeof title);
-  host.complexProperties[FourCC("titl")] = std::string("plain.tif\0", 10);
+  host.Properties().Override(FourCC("unnm"),
+                             std::string(reinterpret_cast<const char*>(title), sizeof title));
+  host.Properties().Override(FourCC("titl"), std::string("plain.tif\0", 10));
   EXPECT_EQ(filter->DocumentTitle().Str(), "\xC5\x9Ctreet.tif");
-  host.complexProperties.erase(FourCC("unnm"));
+  host.Properties().Withhold(FourCC("unnm"));
   EXPECT_EQ(filter->DocumentTitle().Str(), "plain.tif");
-
-  host.complexProperties[FourCC("svls")] = std::string("/scratch/a\0/b\0", 14);
   EXPECT_EQ(filter->ScratchVolumes(), (Strings{"/scratch/a", "/b"}));
   EXPECT_EQ(host.disposed, 3);
-  EXPECT_TRUE(host.liveHandles.empty());
 }
 
 TEST_F(FilterRecord, HandleFailuresAreHostErrors) {
@@ -179,19 +160,15 @@ TEST_F(FilterRecord, HandleFailuresAreHostErrors) {
 }
 
 TEST_F(FilterRecord, SuitesAreAcquiredOnceAndReleasedInTableOrder) {
-  int tables[4] = {};
-  host.AddSuite(kDescriptorSuite, 5, &tables[0]);
-  host.AddSuite(kBufferSuite, 1, &tables[1]);
-  host.AddSuite(kZStringSuite, 1, &tables[2]);
-  host.AddSuite(kChannelPortsSuite, 3, &tables[3]);
+  using ESuite = CQuillmarkPlugin::ESuite;
   Enter();
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kDescriptor), &tables[0]);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kBuffer), &tables[1]);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kZString), &tables[2]);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kChannelPorts), &tables[3]);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kDescriptor), &tables[0]);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kHelp2), nullptr);
-  EXPECT_EQ(filter->Suite(CQuillmarkPlugin::ESuite::kHelp2), nullptr);
+  EXPECT_EQ(filter->Suite(ESuite::kDescriptor), Host::SuiteAccess::Find(kDescriptorSuite, 5));
+  EXPECT_EQ(filter->Suite(ESuite::kBuffer), Host::SuiteAccess::Find(kBufferSuite, 1));
+  EXPECT_EQ(filter->Suite(ESuite::kZString), Host::SuiteAccess::Find(kZStringSuite, 1));
+  EXPECT_NE(filter->Suite(ESuite::kChannelPorts), nullptr);
+  EXPECT_NE(filter->Suite(ESuite::kDescriptor), nullptr);
+  EXPECT_EQ(filter->Suite(ESuite::kAux5c92), nullptr);  // a suite the host lacks
+  EXPECT_EQ(filter->Suite(ESuite::kAux5c92), nullptr);
   EXPECT_EQ(host.acquired.size(), 4u) << "a success is cached, a failure is asked again";
   filter.reset();
   EXPECT_EQ(host.released,
@@ -199,37 +176,29 @@ TEST_F(FilterRecord, SuitesAreAcquiredOnceAndReleasedInTableOrder) {
                      std::string(kBufferSuite) + "#1", std::string(kDescriptorSuite) + "#5"}));
 }
 
-// Three string suites, each knowing some keys.
-struct StringSuite {
-  static HostStatus Answer(const char* text, char* buffer, std::int32_t size,
-                           std::int32_t* length) {
-    *length = std::int32_t(std::strlen(text));
-    if (*length < size) std::memcpy(buffer, text, std::size_t(*length) + 1);
+// String suites that answer the keys holding one of their words: the first
+// knows "/First", the second also "/Second" (with a text longer than the
+// first buffer), the third every key.
+struct Known {
+  std::vector<const char*> words;
+  std::string text;
+};
+const Known kKnown[] = {{{"/First"}, "from ZString"},
+                        {{"/First", "/Second"}, std::string(300, 'u')},
+                        {{"/"}, "from SwiftView"}};
+template <int kSuite>
+HostStatus Lookup(const char* keyed, char* buffer, std::int32_t size, std::int32_t* length) {
+  for (const char* word : kKnown[kSuite].words) {
+    if (std::strstr(keyed, word) == nullptr) continue;
+    *length = std::int32_t(kKnown[kSuite].text.size());
+    if (*length < size) std::memcpy(buffer, kKnown[kSuite].text.c_str(), std::size_t(*length) + 1);
     return 0;
   }
-  static HostStatus ZString(const char* keyed, char* buffer, std::int32_t size,
-                            std::int32_t* length) {
-    if (std::strstr(keyed, "/First") == nullptr) return -1;
-    return Answer("from ZString", buffer, size, length);
-  }
-  static HostStatus Utilities(const char* keyed, char* buffer, std::int32_t size,
-                              std::int32_t* length) {
-    if (std::strstr(keyed, "/Second") == nullptr && std::strstr(keyed, "/First") == nullptr) {
-      return -1;
-    }
-    static const std::string kLong(300, 'u');  // longer than the first buffer
-    return Answer(std::strstr(keyed, "/Second") ? kLong.c_str() : "from Utilities", buffer, size,
-                  length);
-  }
-  static HostStatus SwiftView(const char*, char* buffer, std::int32_t size, std::int32_t* length) {
-    return Answer("from SwiftView", buffer, size, length);
-  }
-};
+  return -1;
+}
 
 TEST_F(FilterRecord, KeyedStringsAskTheHostSuitesInTurn) {
-  const HostStringSuite zstring{&StringSuite::ZString};
-  const HostStringSuite utilities{&StringSuite::Utilities};
-  const HostStringSuite swiftView{&StringSuite::SwiftView};
+  const HostStringSuite zstring{&Lookup<0>}, utilities{&Lookup<1>}, swiftView{&Lookup<2>};
   host.AddSuite(kZStringSuite, 1, &zstring);
   host.AddSuite(kUtilitiesSuite, 1, &utilities);
   host.AddSuite(kSwiftViewSuite, 3, &swiftView);
@@ -262,8 +231,8 @@ struct CountingBuffers {
 TEST_F(FilterRecord, MemoryServiceTakesTheClampedShareAndTheHostsBuffers) {
   const HostBufferSuite buffers{&CountingBuffers::Allocate, &CountingBuffers::Release};
   host.AddSuite(kBufferSuite, 1, &buffers);
-  host.complexProperties[FourCC("svls")] = std::string("/scratch\0", 9);
-  host.record.bufferShare = 0x1000;  // below the floor of 32 MiB
+  host.Properties().Override(FourCC("svls"), std::string("/scratch\0", 9));
+  host.Record()->bufferShare = 0x1000;  // below the floor of 32 MiB
   Enter();
   filter->InitMemory();
   CMemoryService* service = CMemoryService::Get(false);
@@ -281,7 +250,7 @@ TEST_F(FilterRecord, MemoryServiceTakesTheClampedShareAndTheHostsBuffers) {
   EXPECT_EQ(CountingBuffers::Live(), 0);
 
   // Once per object: a second call changes nothing.
-  host.record.bufferShare = 0x7FFFFFFF;
+  host.Record()->bufferShare = 0x7FFFFFFF;
   filter->InitMemory();
   EXPECT_EQ(service->MemoryLimit(), 0x2000000u);
 
@@ -310,7 +279,7 @@ TEST_F(FilterRecord, PalettesHideAroundARunButNotInAbout) {
     return 0;
   }};
   host.AddSuite(kPaletteSuite, 1, &palette);
-  ASSERT_EQ(filter->HandleAbout(&host.record, nullptr), 0);
+  ASSERT_EQ(filter->HandleAbout(host.Record(), nullptr), 0);
   EXPECT_TRUE(calls.empty());
   Enter();
   filter->BeginProcess();

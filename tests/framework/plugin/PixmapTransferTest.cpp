@@ -1,5 +1,5 @@
-// ReadPixmap and WritePixmap against the test host's document: what is read
-// must be the document's samples, and what is written must land in it.
+// ReadPixmap and WritePixmap against the host program's document: what is
+// read must be the document's samples, and what is written must land in it.
 
 #include <memory>
 #include <vector>
@@ -9,7 +9,7 @@
 #include "framework/core/CException.h"
 #include "framework/plugin/CQuillmarkFilter.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/TestHost.h"
+#include "tests/framework/plugin/RealHost.h"
 
 namespace Tarsa::testing {
 namespace {
@@ -24,7 +24,7 @@ class PixmapTransfer : public ::testing::Test {
     filter.reset();
     CPluginEntry::TearDown();
   }
-  void Enter() { ASSERT_EQ(filter->HandleParameters(&host.record, nullptr), 0); }
+  void Enter() { ASSERT_EQ(filter->HandleParameters(host.Record(), nullptr), 0); }
 
   // Every sample of pixmap equals the document's at the same point moved by
   // offset; plane k of the pixmap against plane k of the document.
@@ -46,25 +46,26 @@ class PixmapTransfer : public ::testing::Test {
     return ::testing::AssertionSuccess();
   }
 
-  TestHost host;
+  RealHost host;
   std::unique_ptr<ProbeFilter> filter;
 };
 
 TEST_F(PixmapTransfer, AllEightModesRoundTripWithTransparency) {
-  const HostChannelPortsSuite ports{{}, &TestHost::ReadPixelsFromLevel};
-  const std::int16_t modes[] = {kHostModeGray,   kHostModeRGB,   kHostModeCMYK,  kHostModeLab,
-                                kHostModeGray16, kHostModeRGB48, kHostModeLab48, kHostModeCMYK64};
+  using Host::ImageMode;
   bool usePorts = false;
-  for (std::int16_t mode : modes) {
-    SCOPED_TRACE(mode);
+  for (ImageMode mode :
+       {ImageMode::kGray, ImageMode::kRgb, ImageMode::kCmyk, ImageMode::kLab, ImageMode::kGray16,
+        ImageMode::kRgb48, ImageMode::kLab48, ImageMode::kCmyk64}) {
+    SCOPED_TRACE(int(mode));
     // Half the modes read through the channel ports suite, half through the
     // record's callback.
     usePorts = !usePorts;
     filter.reset();
     host.suites.clear();
-    if (usePorts) host.AddSuite(kChannelPortsSuite, 3, &ports);
+    if (!usePorts) host.AddSuite(kChannelPortsSuite, 3, nullptr);
     filter = std::make_unique<ProbeFilter>();
-    host.MakeDocument(mode, 7, 5, /*transparency=*/true, false, 100 + mode);
+    host.MakeDocument(mode, 7, 5, /*transparency=*/true, 100 + int(mode));
+    host.readCalls = 0;
     Enter();
     const std::uint32_t planes = filter->ColorPlanes() + 1;
     CMemoryPixmap pixmap(filter->ImageRect(), planes, filter->Depth());
@@ -72,7 +73,7 @@ TEST_F(PixmapTransfer, AllEightModesRoundTripWithTransparency) {
     EXPECT_EQ(host.readCalls, int(planes));
     EXPECT_TRUE(MatchesDocument(pixmap));
 
-    // Inverted samples go back through the host's interleaved buffer.
+    // Inverted samples go back through the host's interleaved, padded block.
     const std::uint32_t full = filter->Depth() == 16 ? 32768 : 255;
     const CRect b = pixmap.Bounds();
     for (std::uint32_t k = 0; k < planes; ++k) {
@@ -85,14 +86,16 @@ TEST_F(PixmapTransfer, AllEightModesRoundTripWithTransparency) {
     host.advanceCalls = 0;
     filter->WritePixmap(pixmap, b, 0);
     EXPECT_EQ(host.advanceCalls, 2) << "one for the block, one to finish";
-    EXPECT_EQ(host.record.outRect16.right, 0) << "requests are cleared afterwards";
+    EXPECT_EQ(host.Record()->outRect16.right, 0) << "requests are cleared afterwards";
     EXPECT_TRUE(MatchesDocument(pixmap));
-    host.readCalls = 0;
   }
 }
 
 TEST_F(PixmapTransfer, WideImageUsesOnlyThe32BitCoordinates) {
-  host.MakeDocument(kHostModeRGB48, 40000, 3, true, /*use32=*/true);
+  host.MakeDocument(Host::ImageMode::kRgb48, 40000, 3, true);
+  host.Coords().enabled = 1;
+  host.Record()->imageWidth16 = host.Record()->imageHeight16 = -7;  // nonsense, never read
+  host.Record()->filterRect16 = HostRect16{-7, -7, -7, -7};
   Enter();
   const CRect tile{39990, 0, 40000, 3};
   CMemoryPixmap pixmap(tile, 4, 16);
@@ -104,18 +107,20 @@ TEST_F(PixmapTransfer, WideImageUsesOnlyThe32BitCoordinates) {
   filter->WritePixmap(pixmap, tile, 4);
   EXPECT_TRUE(MatchesDocument(pixmap));
   EXPECT_EQ(host.At(0, 39989, 1), before) << "nothing left of the block";
-  EXPECT_EQ(host.record.outRect16.left, 0) << "the 16-bit request stays unused";
+  EXPECT_EQ(host.Record()->outRect16.left, 0) << "the 16-bit request stays unused";
 }
 
 TEST_F(PixmapTransfer, FloatingSelectionReadsFromItsPlaceInTheDocument) {
-  host.MakeDocument(kHostModeRGB, 30, 20, false);
-  host.record.imageWidth16 = 10;
-  host.record.imageHeight16 = 8;
-  host.record.floatsOverImage = 1;
-  host.record.floatOrigin16 = HostPoint16{3, 5};  // y, x
+  host.MakeDocument(Host::ImageMode::kRgb, 30, 20, false);
+  host.Record()->imageWidth16 = 10;
+  host.Record()->imageHeight16 = 8;
+  host.Record()->floatsOverImage = 1;
+  host.Record()->floatOrigin16 = HostPoint16{3, 5};  // y, x
   Enter();
+  ASSERT_EQ(filter->ImageRect(), (CRect{-5, -3, 25, 17}));
+  EXPECT_EQ(filter->TileOffset(), (CPoint{5, 3}));
+  EXPECT_EQ(filter->LayerRect(), (CRect{0, 0, 10, 8}));
   CMemoryPixmap pixmap(filter->ImageRect(), 3, 8);
-  ASSERT_EQ(pixmap.Bounds(), (CRect{-5, -3, 25, 17}));
   filter->ReadPixmap(pixmap, CQuillmarkFilter::kReadTarget, CQuillmarkFilter::kReadNothing, 0);
   EXPECT_TRUE(MatchesDocument(pixmap, CPoint{5, 3}));
 
@@ -126,23 +131,31 @@ TEST_F(PixmapTransfer, FloatingSelectionReadsFromItsPlaceInTheDocument) {
   EXPECT_EQ(host.At(0, 0, 0), pixmap.Sample(0, 0, 0));
   EXPECT_EQ(host.At(2, 9, 7), pixmap.Sample(2, 9, 7));
   EXPECT_EQ(host.At(0, 12, 9), outside);
+
+  // Not floating: the image is at the origin, and the channels are offset by
+  // the float origin less the filtered area's corner.
+  host.Record()->floatsOverImage = 0;
+  host.Record()->floatOrigin16 = HostPoint16{0, 0};
+  host.Record()->filterRect16 = HostRect16{1, 2, 8, 10};
+  EXPECT_EQ(filter->ImageRect(), (CRect{0, 0, 10, 8}));
+  EXPECT_EQ(filter->TileOffset(), (CPoint{-2, -1}));
 }
 
 TEST_F(PixmapTransfer, ExtraPlaneIsOpaqueWithoutATransparencyNode) {
-  for (std::int16_t mode : {kHostModeLab, kHostModeLab48}) {
+  for (Host::ImageMode mode : {Host::ImageMode::kLab, Host::ImageMode::kLab48}) {
     host.MakeDocument(mode, 4, 3, /*transparency=*/false);
     Enter();
     CMemoryPixmap pixmap(filter->ImageRect(), 4, filter->Depth());
     filter->ReadPixmap(pixmap, CQuillmarkFilter::kReadTarget, CQuillmarkFilter::kReadNothing, 0);
     EXPECT_TRUE(MatchesDocument(pixmap, {}, 3));
-    const std::uint32_t opaque = mode == kHostModeLab ? 255 : 32768;
+    const std::uint32_t opaque = mode == Host::ImageMode::kLab ? 255 : 32768;
     EXPECT_EQ(pixmap.Sample(3, 0, 0), opaque);
     EXPECT_EQ(pixmap.Sample(3, 3, 2), opaque);
   }
 }
 
 TEST_F(PixmapTransfer, MarginsAreFilledRepeatedOrLeftToTheFallback) {
-  host.MakeDocument(kHostModeGray, 6, 4, true);
+  host.MakeDocument(Host::ImageMode::kGray, 6, 4, true);
   Enter();
   const CRect wide{-2, -1, 8, 5};  // one to two pixels beyond each edge
   const std::uint32_t fill[] = {10, 20};
@@ -173,11 +186,12 @@ TEST_F(PixmapTransfer, MarginsAreFilledRepeatedOrLeftToTheFallback) {
 }
 
 TEST_F(PixmapTransfer, SelectorsPickTheirChannelOrFallBack) {
-  host.MakeDocument(kHostModeGray, 3, 3, true);
+  host.MakeDocument(Host::ImageMode::kGray, 3, 3, true);
   // The document's second plane stands for an alpha channel.
+  HostChannelNode* second = host.Info().targetTransparency;
   HostAlphaChannel alpha{};
-  alpha.channel = &host.nodes[1];
-  host.info.alphaChannels = &alpha;
+  alpha.channel = second;
+  host.Info().alphaChannels = &alpha;
   Enter();
   CMemoryPixmap pixmap(CRect{0, 0, 3, 3}, 1, 8);
   filter->ReadPixmap(pixmap, 0, CQuillmarkFilter::kReadNothing, 0);
@@ -186,14 +200,14 @@ TEST_F(PixmapTransfer, SelectorsPickTheirChannelOrFallBack) {
   filter->ReadPixmap(pixmap, 1, CQuillmarkFilter::kReadTarget, 0);
   EXPECT_EQ(pixmap.Sample(0, 2, 1), host.At(0, 2, 1));
   // An unreadable target gives way to a readable target mask.
-  host.nodes[0].readable = 0;
-  host.info.targetMask = &host.nodes[1];
+  host.Info().targetCompositeChannels->readable = 0;
+  host.Info().targetMask = second;
   filter->ReadPixmap(pixmap, CQuillmarkFilter::kReadTarget, CQuillmarkFilter::kReadNothing, 0);
   EXPECT_EQ(pixmap.Sample(0, 1, 1), host.At(1, 1, 1));
 }
 
 TEST_F(PixmapTransfer, HostRefusalsStopTheTransfer) {
-  host.MakeDocument(kHostModeRGB, 4, 4, false);
+  host.MakeDocument(Host::ImageMode::kRgb, 4, 4, false);
   Enter();
   CMemoryPixmap pixmap(CRect{0, 0, 4, 4}, 3, 8);
   host.readAnswer = -36;

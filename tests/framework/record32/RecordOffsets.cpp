@@ -88,5 +88,13 @@ static_assert(offsetof(Tarsa::HostPropertyProcs, getProperty) == 4);
 static_assert(offsetof(Tarsa::HostChannelPortsSuite, readPixelsFromLevel) == 36);
 static_assert(offsetof(Tarsa::HostDescriptorSuite, putEnumerated) == 17 * 4);
 static_assert(offsetof(Tarsa::HostDescriptorSuite, getData) == 45 * 4);
+static_assert(offsetof(Tarsa::HostLensQuery, cropFactor) == 24 &&
+              offsetof(Tarsa::HostLensQuery, model) == 32 &&
+              offsetof(Tarsa::HostLensQuery, results) == 48 && sizeof(Tarsa::HostLensQuery) == 56);
+static_assert(offsetof(Tarsa::HostLensResult, path) == 4 &&
+              offsetof(Tarsa::HostLensResult, flagA) == 28 &&
+              offsetof(Tarsa::HostLensResult, pathIsWide) == 30 &&
+              offsetof(Tarsa::HostLensResult, cropFactor) == 32 &&
+              sizeof(Tarsa::HostLensResult) == 36);
 
 }  // namespace

@@ -73,16 +73,27 @@ TEST(PropertyList, ParserReadsTheModuleList) {
 
 TEST(PropertyList, DamagedListsAreRefused) {
   const auto bytes = ModulePropertyList();
-  // Every cut inside the list runs out somewhere.
+  const auto refusal = [](std::span<const std::uint8_t> list) -> std::string {
+    try {
+      const CPropertyList parsed(list);
+    } catch (const CError& error) {
+      return error.ErrorText();
+    }
+    return "accepted";
+  };
+  // Running out anywhere is the list's own "damaged", not the container's
+  // end of data.
   for (std::size_t size = 0; size < bytes.size(); ++size) {
-    EXPECT_THROW(CPropertyList(std::span(bytes).first(size)), CError) << size;
+    EXPECT_EQ(refusal(std::span(bytes).first(size)),
+              "$$$/Tarsa/PropertyList/Error/Damaged=The plug-in property list is damaged.")
+        << size;
   }
   auto other = bytes;
   other[0] = 2;  // version
-  EXPECT_THROW(CPropertyList{other}, CError);
+  EXPECT_NE(refusal(other), "accepted");
   other = bytes;
   other[9] = 0x10;  // a count no list of this size can hold
-  EXPECT_THROW(CPropertyList{other}, CError);
+  EXPECT_NE(refusal(other), "accepted");
 
   // A list without the texts the host asks for: the accessors say so.
   const auto bare =
@@ -91,22 +102,6 @@ TEST(PropertyList, DamagedListsAreRefused) {
   EXPECT_EQ(list.Properties().size(), 1u);
   EXPECT_THROW(list.EnableExpression(), CError);
   EXPECT_THROW(list.EntryName(), CError);
-}
-
-// Running out anywhere is the list's own "damaged", not the container's
-// end of data.
-TEST(PropertyList, DamageIsReportedInTheListsOwnWords) {
-  const auto bytes = ModulePropertyList();
-  for (const std::size_t size : {std::size_t{1}, std::size_t{12}, bytes.size() - 1}) {
-    try {
-      const CPropertyList list{std::span(bytes).first(size)};
-      ADD_FAILURE() << size << " bytes were accepted";
-    } catch (const CError& error) {
-      EXPECT_EQ(error.ErrorText(),
-                "$$$/Tarsa/PropertyList/Error/Damaged=The plug-in property list is damaged.")
-          << size;
-    }
-  }
 }
 
 }  // namespace

@@ -101,9 +101,18 @@ TEST(ResourceTable, DamagedBlobsAreRefused) {
   writer.Add(kAbcd, 2, Bytes{6});
   const Bytes blob = writer.Write();
   ASSERT_EQ(CResourceTable::Borrow(blob).Count(), 2u);
-
+  const auto refusal = [](std::span<const std::uint8_t> bytes) -> std::string {
+    try {
+      CResourceTable::Borrow(bytes);
+    } catch (const CError& error) {
+      return error.ErrorText();
+    }
+    return "accepted";
+  };
+  // Running out anywhere is damage in the table's own words.
+  const std::string damaged = "$$$/Tarsa/Resource/Error/Damaged=The resource table is damaged.";
   for (std::size_t size = 0; size < blob.size(); ++size) {
-    EXPECT_THROW(CResourceTable::Borrow(std::span(blob).first(size)), CError) << size;
+    EXPECT_EQ(refusal(std::span(blob).first(size)), damaged) << size;
   }
   // Bytes past the blob's own size are section padding.
   Bytes padded = blob;
@@ -115,44 +124,14 @@ TEST(ResourceTable, DamagedBlobsAreRefused) {
     copy[offset] = value;
     return copy;
   };
-  EXPECT_THROW(CResourceTable::Borrow(patched(0, 'X')), CError);    // magic
-  EXPECT_THROW(CResourceTable::Borrow(patched(4, 2)), CError);      // version
-  EXPECT_THROW(CResourceTable::Borrow(patched(8, 3)), CError);      // count
-  EXPECT_THROW(CResourceTable::Borrow(patched(12, 0x38)), CError);  // size short of the end
-  EXPECT_THROW(CResourceTable::Borrow(patched(28, 0x30)), CError);  // data past the end
-  EXPECT_THROW(CResourceTable::Borrow(patched(38, 9)), CError);     // padding not zero
-  EXPECT_THROW(CResourceTable::Borrow(patched(44, 1)), CError);     // second entry is "1" too
-  EXPECT_THROW(CResourceTable::Borrow(patched(24, 1)), CError);     // a number and a name
-  try {
-    CResourceTable::Borrow(patched(44, 1));
-    ADD_FAILURE() << "a twin was accepted";
-  } catch (const CError& error) {
-    EXPECT_THAT(error.ErrorText(), ::testing::HasSubstr("'ABCD' 1 twice"));
-  }
-}
-
-// A blob that runs out is damaged in the table's own words, wherever it runs
-// out; the more specific refusals keep theirs.
-TEST(ResourceTable, DamageIsReportedInTheTablesOwnWords) {
-  CResourceWriter writer;
-  writer.Add(kAbcd, 1, Bytes{1, 2, 3});
-  const Bytes blob = writer.Write();
-  const auto errorOf = [](std::span<const std::uint8_t> bytes) -> std::string {
-    try {
-      CResourceTable::Borrow(bytes);
-    } catch (const CError& error) {
-      return error.ErrorText();
-    }
-    return "accepted";
-  };
-  const std::string damaged = "$$$/Tarsa/Resource/Error/Damaged=The resource table is damaged.";
-  EXPECT_EQ(errorOf(std::span(blob).first(2)), damaged);  // inside the magic
-  Bytes longData = blob;
-  longData[28] = 0x30;  // the data runs past the blob's own size
-  EXPECT_EQ(errorOf(longData), damaged);
-  Bytes version = blob;
-  version[4] = 2;
-  EXPECT_THAT(errorOf(version), ::testing::HasSubstr("/Error/Version="));
+  EXPECT_NE(refusal(patched(0, 'X')), "accepted");  // magic
+  EXPECT_THAT(refusal(patched(4, 2)), ::testing::HasSubstr("/Error/Version="));
+  EXPECT_NE(refusal(patched(8, 3)), "accepted");      // count
+  EXPECT_NE(refusal(patched(12, 0x38)), "accepted");  // size short of the end
+  EXPECT_EQ(refusal(patched(28, 0x30)), damaged);     // data past the end
+  EXPECT_NE(refusal(patched(38, 9)), "accepted");     // padding not zero
+  EXPECT_THAT(refusal(patched(44, 1)), ::testing::HasSubstr("'ABCD' 1 twice"));
+  EXPECT_NE(refusal(patched(24, 1)), "accepted");  // a number and a name
 }
 
 TEST(ResourceTable, RandomDamageNeverReadsOutside) {

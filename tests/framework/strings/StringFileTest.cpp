@@ -28,34 +28,40 @@ Entries Load(std::u16string_view text, bool littleEndian = true, bool withMark =
   return Contents(table);
 }
 
-TEST(StringFile, ReadsBothByteOrdersAndTheLastEntryWithoutLineEnd) {
-  const std::u16string text = u"\"$$$/A=alpha\"\r\n\"$$$/B=beta\"";
-  const Entries expected{{"/A", "alpha"}, {"/B", "beta"}};
-  EXPECT_EQ(Load(text, /*littleEndian=*/true), expected);
-  EXPECT_EQ(Load(text, /*littleEndian=*/false), expected);
-  // Without a mark the text is big-endian from its first byte.
-  EXPECT_EQ(Load(text, /*littleEndian=*/false, /*withMark=*/false), expected);
-}
-
-TEST(StringFile, KeyStartsAtItsSlashWhateverCameBefore) {
-  EXPECT_EQ(Load(u"/Bare=1\n$$$/Dollars=2\n\"\"$\"$/Mixed=3\n/In\"Key$=4\n=no key\n\n"),
-            (Entries{{"/Bare", "1"}, {"/Dollars", "2"}, {"/Mixed", "3"}, {"/In\"Key$", "4"}}));
-}
-
-TEST(StringFile, ValuesTakeFileEscapesThenTheirOwn) {
-  // File layer: a backslash takes the next character literally, so the file's
-  // "\\n" reaches ParseEscapes as "\n", a LF; a trailing quote is dropped once.
-  EXPECT_EQ(Load(u"\"$$$/Say=say \\\"hi\\\" ^n\\\\n=\"\n\"$$$/Quote=q\"\""),
-            (Entries{{"/Say", "say \"hi\" \n\n="}, {"/Quote", "q\""}}));
-}
-
-TEST(StringFile, ValuesBecomeUtf8) {
-  std::u16string text = u"/Cafe=caf\u00E9 \U0001F600\n/Lone=";
-  text += {char16_t{0xD800}, u'x'};  // a high surrogate with no partner
-  EXPECT_EQ(Load(text, /*littleEndian=*/false), (Entries{{"/Cafe", "caf\xC3\xA9 \xF0\x9F\x98\x80"},
-                                                         {"/Lone",
-                                                          "\xEF\xBF\xBD"
-                                                          "x"}}));
+TEST(StringFile, EntriesKeysAndValues) {
+  std::u16string unpaired = u"/Lone=";
+  unpaired += {char16_t{0xD800}, u'x'};  // a high surrogate with no partner
+  const struct {
+    std::u16string text;
+    bool littleEndian, withMark;
+    Entries expected;
+  } cases[] = {
+      // Both byte orders; without a mark the text is big-endian from its
+      // first byte; the last entry needs no line end.
+      {u"\"$$$/A=alpha\"\r\n\"$$$/B=beta\"", true, true, {{"/A", "alpha"}, {"/B", "beta"}}},
+      {u"\"$$$/A=alpha\"\r\n\"$$$/B=beta\"", false, true, {{"/A", "alpha"}, {"/B", "beta"}}},
+      {u"\"$$$/A=alpha\"\r\n\"$$$/B=beta\"", false, false, {{"/A", "alpha"}, {"/B", "beta"}}},
+      // A key starts at its slash, whatever came before.
+      {u"/Bare=1\n$$$/Dollars=2\n\"\"$\"$/Mixed=3\n/In\"Key$=4\n=no key\n\n",
+       true,
+       true,
+       {{"/Bare", "1"}, {"/Dollars", "2"}, {"/Mixed", "3"}, {"/In\"Key$", "4"}}},
+      // A backslash takes the next character literally, so the file's "\\n"
+      // reaches ParseEscapes as "\n", a LF; a trailing quote is dropped once.
+      {u"\"$$$/Say=say \\\"hi\\\" ^n\\\\n=\"\n\"$$$/Quote=q\"\"",
+       true,
+       true,
+       {{"/Say", "say \"hi\" \n\n="}, {"/Quote", "q\""}}},
+      // Values become UTF-8; a lone surrogate becomes U+FFFD.
+      {u"/Cafe=caf\u00E9 \U0001F600", false, true, {{"/Cafe", "caf\xC3\xA9 \xF0\x9F\x98\x80"}}},
+      {unpaired,
+       false,
+       true,
+       {{"/Lone",
+         "\xEF\xBF\xBD"
+         "x"}}},
+  };
+  for (const auto& c : cases) EXPECT_EQ(Load(c.text, c.littleEndian, c.withMark), c.expected);
 }
 
 TEST(StringFile, LaterEntriesAndLaterFilesOverride) {

@@ -2,6 +2,7 @@
 
 #include <cmath>
 #include <limits>
+#include <random>
 #include <string>
 
 #include "framework/plugin/HostSuites.h"
@@ -91,6 +92,20 @@ TEST(ActionFileTest, DamagedFilesNameTheLine) {
     }
   }
   EXPECT_THROW(ActionFile::Parse(""), HostError);
+
+  // Cut anywhere, then a byte spoiled: parsed or refused, never a crash.
+  const std::string whole = "archway-action 1\nfocL float 0.1\ncnsD data 4 TGluZQ==\n";
+  std::mt19937 random(77);
+  for (size_t length = 0; length <= whole.size(); ++length) {
+    std::string bytes = whole.substr(0, length);
+    for (int spoilt = 0; spoilt < 2; ++spoilt) {
+      try {
+        ActionFile::Parse(bytes);
+      } catch (const HostError&) {
+      }
+      if (!bytes.empty()) bytes[random() % bytes.size()] = static_cast<char>(random());
+    }
+  }
 }
 
 TEST(ActionFileTest, ReadingNamesTheFile) {

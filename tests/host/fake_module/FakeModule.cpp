@@ -26,11 +26,10 @@ struct Image {
   std::vector<uint8_t> samples;  // planar
 };
 
-const HostDescriptorSuite* Descriptors(HostFilterRecord* record) {
+const void* Suite(HostFilterRecord* record, const char* name, int32_t version) {
   const void* suite = nullptr;
   auto* access = static_cast<HostSuiteAccess*>(record->suiteAccess);
-  if (access->acquire(kDescriptorSuite, 5, &suite) != 0) return nullptr;
-  return static_cast<const HostDescriptorSuite*>(suite);
+  return access->acquire(name, version, &suite) == 0 ? suite : nullptr;
 }
 
 intptr_t Property(HostFilterRecord* record, const char (&key)[5]) {
@@ -41,10 +40,9 @@ intptr_t Property(HostFilterRecord* record, const char (&key)[5]) {
 }
 
 bool ReadImage(HostFilterRecord* record, Image& image) {
-  const void* suite = nullptr;
-  auto* access = static_cast<HostSuiteAccess*>(record->suiteAccess);
-  if (access->acquire(kChannelPortsSuite, 3, &suite) != 0) return false;
-  const auto* ports = static_cast<const HostChannelPortsSuite*>(suite);
+  const auto* ports =
+      static_cast<const HostChannelPortsSuite*>(Suite(record, kChannelPortsSuite, 3));
+  if (ports == nullptr) return false;
   auto* info = static_cast<HostDocumentInfo*>(record->documentInfo);
   const HostRect32 all = {0, 0, image.height, image.width};
   const size_t planeSize = size_t(image.width) * image.height * image.bytes;
@@ -91,7 +89,8 @@ int16_t Start(HostFilterRecord* record) {
     std::fputs("This feature requires graphics processor acceleration.\n", stderr);
     return 1;
   }
-  const HostDescriptorSuite* descriptors = Descriptors(record);
+  const auto* descriptors =
+      static_cast<const HostDescriptorSuite*>(Suite(record, kDescriptorSuite, 5));
   if (descriptors == nullptr) return 1;
   auto* script = static_cast<HostScriptBlock*>(record->scriptBlock);
   const intptr_t replay = Property(record, "plip");

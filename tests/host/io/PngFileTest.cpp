@@ -25,18 +25,16 @@ struct RawPng {
   png_uint_32 height;
   int bitDepth;
   int colourType;
-  bool interlaced;
-  const png_color* palette;
-  int paletteSize;
-  const png_byte* transparency;  // per palette entry
-  int transparencyCount;
-  png_bytepp rows;
+  std::vector<std::vector<png_byte>> rows;
+  bool interlaced = false;
+  std::vector<png_color> palette = {};
+  std::vector<png_byte> transparency = {};  // per palette entry
 };
 
 void OnRawError(png_structp png, png_const_charp) { png_longjmp(png, 1); }
 
 // Plain C-style: nothing with a destructor lives across the jump.
-bool WriteRawPngRows(std::FILE* file, const RawPng* shape) {
+bool WriteRawPngTo(std::FILE* file, const RawPng& shape, png_bytepp rows) {
   png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, OnRawError, nullptr);
   png_infop info = png_create_info_struct(png);
   if (setjmp(png_jmpbuf(png))) {
@@ -44,29 +42,33 @@ bool WriteRawPngRows(std::FILE* file, const RawPng* shape) {
     return false;
   }
   png_init_io(png, file);
-  png_set_IHDR(png, info, shape->width, shape->height, shape->bitDepth, shape->colourType,
-               shape->interlaced ? PNG_INTERLACE_ADAM7 : PNG_INTERLACE_NONE,
+  png_set_IHDR(png, info, shape.width, shape.height, shape.bitDepth, shape.colourType,
+               shape.interlaced ? PNG_INTERLACE_ADAM7 : PNG_INTERLACE_NONE,
                PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
-  if (shape->palette != nullptr) png_set_PLTE(png, info, shape->palette, shape->paletteSize);
-  if (shape->transparency != nullptr) {
-    png_set_tRNS(png, info, shape->transparency, shape->transparencyCount, nullptr);
+  if (!shape.palette.empty()) {
+    png_set_PLTE(png, info, shape.palette.data(), static_cast<int>(shape.palette.size()));
+  }
+  if (!shape.transparency.empty()) {
+    png_set_tRNS(png, info, shape.transparency.data(), static_cast<int>(shape.transparency.size()),
+                 nullptr);
   }
   png_write_info(png, info);
-  png_write_image(png, shape->rows);
+  png_write_image(png, rows);
   png_write_end(png, info);
   png_destroy_write_struct(&png, &info);
   return true;
 }
 
-void WriteRawPng(const std::string& path, RawPng shape, std::vector<std::vector<png_byte>>& rows) {
-  std::vector<png_bytep> pointers;
-  for (auto& row : rows) pointers.push_back(row.data());
-  shape.rows = pointers.data();
-  std::FILE* file = std::fopen(path.c_str(), "wb");
-  ASSERT_NE(file, nullptr);
-  const bool written = WriteRawPngRows(file, &shape);
+// Writes the file and reads it back through the code under test.
+std::unique_ptr<HostDocument> ReadRawPng(const ScratchFolder& folder, RawPng shape) {
+  std::vector<png_bytep> rows;
+  for (auto& row : shape.rows) rows.push_back(row.data());
+  std::FILE* file = std::fopen(folder.File("raw.png").c_str(), "wb");
+  EXPECT_NE(file, nullptr);
+  const bool written = WriteRawPngTo(file, shape, rows.data());
   std::fclose(file);
-  ASSERT_TRUE(written);
+  EXPECT_TRUE(written);
+  return ImageFile::Read(folder.File("raw.png"));
 }
 
 TEST(PngFileTest, GrayAndRgbAtBothDepthsRoundTripExactly) {
@@ -92,12 +94,14 @@ TEST(PngFileTest, GrayAndRgbAtBothDepthsRoundTripExactly) {
 TEST(PngFileTest, ExpandsPalettesLowDepthsAndGrayAlpha) {
   ScratchFolder folder;
   // A 2-bit palette with a half-transparent third entry: pixels 0 1 2 3.
-  const png_color palette[4] = {{255, 0, 0}, {0, 255, 0}, {0, 0, 255}, {7, 8, 9}};
-  const png_byte alphas[3] = {255, 255, 128};
-  std::vector<std::vector<png_byte>> rows = {{0b00011011}};
-  WriteRawPng(folder.File("palette.png"),
-              {4, 1, 2, PNG_COLOR_TYPE_PALETTE, false, palette, 4, alphas, 3, nullptr}, rows);
-  auto rgba = ImageFile::Read(folder.File("palette.png"));
+  auto rgba = ReadRawPng(folder, {4,
+                                  1,
+                                  2,
+                                  PNG_COLOR_TYPE_PALETTE,
+                                  {{0b00011011}},
+                                  false,
+                                  {{255, 0, 0}, {0, 255, 0}, {0, 0, 255}, {7, 8, 9}},
+                                  {255, 255, 128}});
   ASSERT_EQ(rgba->Mode(), ImageMode::kRgb);
   ASSERT_TRUE(rgba->HasTransparency());
   EXPECT_EQ(rgba->Sample(0, 0, 0), 255);
@@ -108,10 +112,8 @@ TEST(PngFileTest, ExpandsPalettesLowDepthsAndGrayAlpha) {
 
   // 16-bit gray with alpha, big-endian in the file: 0x0102 = 258 -> 129,
   // 0xffff -> 32768, 0x0001 -> 1 (0.50001 rounds up).
-  rows = {{0x01, 0x02, 0xff, 0xff, 0x00, 0x01, 0x00, 0x00}};
-  WriteRawPng(folder.File("gray16.png"),
-              {2, 1, 16, PNG_COLOR_TYPE_GRAY_ALPHA, false, nullptr, 0, nullptr, 0, nullptr}, rows);
-  auto gray16 = ImageFile::Read(folder.File("gray16.png"));
+  auto gray16 = ReadRawPng(
+      folder, {2, 1, 16, PNG_COLOR_TYPE_GRAY_ALPHA, {{0x01, 0x02, 0xff, 0xff, 0x00, 0x01, 0, 0}}});
   ASSERT_EQ(gray16->Mode(), ImageMode::kGray16);
   ASSERT_TRUE(gray16->HasTransparency());
   EXPECT_EQ(gray16->Sample(0, 0, 0), 129);
@@ -127,9 +129,7 @@ TEST(PngFileTest, ReadsInterlacedFiles) {
   for (int y = 0; y < 11; ++y) {
     for (int i = 0; i < 13 * 3; ++i) rows[y][i] = static_cast<png_byte>(y * 40 + i * 3);
   }
-  WriteRawPng(folder.File("interlaced.png"),
-              {13, 11, 8, PNG_COLOR_TYPE_RGB, true, nullptr, 0, nullptr, 0, nullptr}, rows);
-  auto document = ImageFile::Read(folder.File("interlaced.png"));
+  auto document = ReadRawPng(folder, {13, 11, 8, PNG_COLOR_TYPE_RGB, rows, true});
   ASSERT_EQ(document->Mode(), ImageMode::kRgb);
   for (int y = 0; y < 11; ++y) {
     for (int x = 0; x < 13; ++x) {

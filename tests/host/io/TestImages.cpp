@@ -1,38 +1,10 @@
 #include "tests/host/io/TestImages.h"
 
-#include <stdlib.h>
-
 #include <algorithm>
 #include <cmath>
-#include <filesystem>
-#include <fstream>
 #include <random>
-#include <set>
-#include <sstream>
-#include <stdexcept>
 
 namespace Host::Testing {
-
-ScratchFolder::ScratchFolder() {
-  std::string pattern = std::filesystem::temp_directory_path() / "archway_host_io_XXXXXX";
-  if (mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
-  path_ = pattern;
-}
-
-ScratchFolder::~ScratchFolder() {
-  std::error_code ignored;
-  std::filesystem::remove_all(path_, ignored);
-}
-
-std::string ScratchFolder::Listing() const {
-  std::set<std::string> names;
-  for (const auto& entry : std::filesystem::directory_iterator(path_)) {
-    names.insert(entry.path().filename().string());
-  }
-  std::string listing;
-  for (const std::string& name : names) listing += name + "\n";
-  return listing;
-}
 
 std::unique_ptr<HostDocument> RandomDocument(int32_t width, int32_t height, ImageMode mode,
                                              bool transparency, uint32_t seed) {
@@ -77,16 +49,6 @@ int LargestDifference(const HostDocument& a, const HostDocument& b) {
     }
   }
   return largest;
-}
-
-std::string ReadBytes(const std::string& path) {
-  std::ostringstream bytes;
-  bytes << std::ifstream(path, std::ios::binary).rdbuf();
-  return bytes.str();
-}
-
-void WriteBytes(const std::string& path, const std::string& bytes) {
-  std::ofstream(path, std::ios::binary | std::ios::trunc) << bytes;
 }
 
 }  // namespace Host::Testing

@@ -29,8 +29,10 @@ struct RawTiff {
   uint16_t samples;
   uint16_t photometric;
   uint16_t planar = PLANARCONFIG_CONTIG;
-  uint32_t tile = 0;   // tile side; 0 for strips of 7 rows
-  int extraType = -1;  // EXTRASAMPLE_*, or none
+  uint32_t tile = 0;                        // tile side; 0 for strips
+  uint32_t strip = 7;                       // rows per strip
+  int extraType = -1;                       // EXTRASAMPLE_*, or none
+  uint16_t compression = COMPRESSION_NONE;  // JPEG: from RGB at quality 95
   std::vector<uint16_t> colourMap;
 };
 
@@ -44,7 +46,11 @@ void WriteRawTiff(const std::string& path, const RawTiff& shape,
   TIFFSetField(tiff, TIFFTAG_SAMPLESPERPIXEL, shape.samples);
   TIFFSetField(tiff, TIFFTAG_PHOTOMETRIC, shape.photometric);
   TIFFSetField(tiff, TIFFTAG_PLANARCONFIG, shape.planar);
-  TIFFSetField(tiff, TIFFTAG_COMPRESSION, COMPRESSION_NONE);
+  TIFFSetField(tiff, TIFFTAG_COMPRESSION, shape.compression);
+  if (shape.compression == COMPRESSION_JPEG) {
+    TIFFSetField(tiff, TIFFTAG_JPEGCOLORMODE, JPEGCOLORMODE_RGB);
+    TIFFSetField(tiff, TIFFTAG_JPEGQUALITY, 95);
+  }
   if (shape.extraType >= 0) {
     const uint16_t extra[] = {static_cast<uint16_t>(shape.extraType)};
     TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, 1, extra);
@@ -56,7 +62,7 @@ void WriteRawTiff(const std::string& path, const RawTiff& shape,
   }
   const bool separate = shape.planar == PLANARCONFIG_SEPARATE;
   const uint32_t blockWidth = shape.tile ? shape.tile : shape.width;
-  const uint32_t blockHeight = shape.tile ? shape.tile : 7;
+  const uint32_t blockHeight = shape.tile ? shape.tile : shape.strip;
   if (shape.tile) {
     TIFFSetField(tiff, TIFFTAG_TILEWIDTH, shape.tile);
     TIFFSetField(tiff, TIFFTAG_TILELENGTH, shape.tile);
@@ -234,59 +240,38 @@ TEST(TiffFileTest, CmykIsInkInTheFileAndPaperInTheHost) {
             (std::vector<uint32_t>{0, 0, 0, 0, 255, 200, 55, 0}));
 }
 
-// Planar layouts and tiles, each with an unassociated alpha sample.
-struct LayoutCase {
-  uint16_t bits;
-  uint16_t planar;
-  uint32_t tile;
-};
-
-class TiffLayoutTest : public ::testing::TestWithParam<LayoutCase> {};
-
-TEST_P(TiffLayoutTest, ReadsRgbaWrittenByLibtiff) {
-  const LayoutCase layout = GetParam();
+TEST(TiffFileTest, ReadsRgbaInEveryPlanarAndTiledLayout) {
   ScratchFolder folder;
-  // 40 x 35 does not fill the 16 x 16 tiles or 7-row strips evenly.
-  RawTiff shape(40, 35, layout.bits, 4, PHOTOMETRIC_RGB);
-  shape.planar = layout.planar;
-  shape.tile = layout.tile;
-  shape.extraType = EXTRASAMPLE_UNASSALPHA;
-  const uint32_t max = layout.bits == 16 ? 65535 : 255;
-  std::vector<uint32_t> values;
-  for (uint32_t y = 0; y < shape.height; ++y) {
-    for (uint32_t x = 0; x < shape.width; ++x) {
-      for (uint32_t s = 0; s < 4; ++s)
-        values.push_back((x * 97 + y * 31 + s * 53) * 37 % (max + 1));
-    }
-  }
-  WriteRawTiff(folder.File("layout.tif"), shape, values);
-  auto document = ImageFile::Read(folder.File("layout.tif"));
-  ASSERT_EQ(document->Mode(), layout.bits == 16 ? ImageMode::kRgb48 : ImageMode::kRgb);
-  ASSERT_TRUE(document->HasTransparency());
-  for (uint32_t y = 0; y < shape.height; ++y) {
-    for (uint32_t x = 0; x < shape.width; ++x) {
-      for (int s = 0; s < 4; ++s) {
-        const uint32_t file = values[(y * shape.width + x) * 4 + s];
-        const int expected = layout.bits == 16 ? HostOf(file) : static_cast<int>(file);
-        ASSERT_EQ(document->Sample(s, x, y), expected) << x << "," << y << " sample " << s;
-      }
+  struct Layout {
+    uint16_t bits;
+    uint16_t planar;
+    uint32_t tile;
+  };
+  for (const Layout& layout :
+       {Layout{8, PLANARCONFIG_SEPARATE, 0}, Layout{8, PLANARCONFIG_SEPARATE, 16},
+        Layout{8, PLANARCONFIG_CONTIG, 16}, Layout{16, PLANARCONFIG_SEPARATE, 16},
+        Layout{16, PLANARCONFIG_CONTIG, 16}, Layout{16, PLANARCONFIG_SEPARATE, 0}}) {
+    SCOPED_TRACE(std::to_string(layout.bits) + " bits, planar " + std::to_string(layout.planar) +
+                 ", tile " + std::to_string(layout.tile));
+    // 40 x 35 does not fill the 16 x 16 tiles or 7-row strips evenly; the
+    // alpha sample is unassociated.
+    RawTiff shape(40, 35, layout.bits, 4, PHOTOMETRIC_RGB);
+    shape.planar = layout.planar;
+    shape.tile = layout.tile;
+    shape.extraType = EXTRASAMPLE_UNASSALPHA;
+    const uint32_t max = layout.bits == 16 ? 65535 : 255;
+    std::vector<uint32_t> values;
+    for (uint32_t i = 0; i < 40 * 35 * 4; ++i) values.push_back(i * 2731 % (max + 1));
+    WriteRawTiff(folder.File("layout.tif"), shape, values);
+    auto document = ImageFile::Read(folder.File("layout.tif"));
+    ASSERT_EQ(document->Mode(), layout.bits == 16 ? ImageMode::kRgb48 : ImageMode::kRgb);
+    ASSERT_TRUE(document->HasTransparency());
+    for (uint32_t i = 0; i < values.size(); ++i) {
+      const int expected = layout.bits == 16 ? HostOf(values[i]) : static_cast<int>(values[i]);
+      ASSERT_EQ(document->Sample(i % 4, i / 4 % 40, i / 160), expected) << "sample " << i;
     }
   }
 }
-
-INSTANTIATE_TEST_SUITE_P(Layouts, TiffLayoutTest,
-                         ::testing::Values(LayoutCase{8, PLANARCONFIG_SEPARATE, 0},
-                                           LayoutCase{8, PLANARCONFIG_SEPARATE, 16},
-                                           LayoutCase{8, PLANARCONFIG_CONTIG, 16},
-                                           LayoutCase{16, PLANARCONFIG_SEPARATE, 16},
-                                           LayoutCase{16, PLANARCONFIG_CONTIG, 16},
-                                           LayoutCase{16, PLANARCONFIG_SEPARATE, 0}),
-                         [](const ::testing::TestParamInfo<LayoutCase>& info) {
-                           const LayoutCase& c = info.param;
-                           return std::to_string(c.bits) + "Bit" +
-                                  (c.planar == PLANARCONFIG_SEPARATE ? "Separate" : "Contiguous") +
-                                  (c.tile ? "Tiles" : "Strips");
-                         });
 
 TEST(TiffFileTest, AssociatedAlphaIsDividedOut) {
   ScratchFolder folder;
@@ -334,26 +319,12 @@ TEST(TiffFileTest, ReadsJpegCompressedYCbCr) {
   ScratchFolder folder;
   // Flat 16 x 16 colour blocks: JPEG keeps each block's mean to a level or two.
   const int colours[2][3] = {{200, 40, 90}, {20, 220, 140}};
-  {
-    TIFF* tiff = TIFFOpen(folder.File("ycbcr.tif").c_str(), "w");
-    ASSERT_NE(tiff, nullptr);
-    TIFFSetField(tiff, TIFFTAG_IMAGEWIDTH, 32);
-    TIFFSetField(tiff, TIFFTAG_IMAGELENGTH, 16);
-    TIFFSetField(tiff, TIFFTAG_BITSPERSAMPLE, 8);
-    TIFFSetField(tiff, TIFFTAG_SAMPLESPERPIXEL, 3);
-    TIFFSetField(tiff, TIFFTAG_PLANARCONFIG, PLANARCONFIG_CONTIG);
-    TIFFSetField(tiff, TIFFTAG_COMPRESSION, COMPRESSION_JPEG);
-    TIFFSetField(tiff, TIFFTAG_PHOTOMETRIC, PHOTOMETRIC_YCBCR);
-    TIFFSetField(tiff, TIFFTAG_JPEGCOLORMODE, JPEGCOLORMODE_RGB);
-    TIFFSetField(tiff, TIFFTAG_JPEGQUALITY, 95);
-    TIFFSetField(tiff, TIFFTAG_ROWSPERSTRIP, 16);
-    std::vector<uint8_t> row(32 * 3);
-    for (int x = 0; x < 32; ++x) {
-      for (int c = 0; c < 3; ++c) row[x * 3 + c] = static_cast<uint8_t>(colours[x / 16][c]);
-    }
-    for (uint32_t y = 0; y < 16; ++y) ASSERT_GE(TIFFWriteScanline(tiff, row.data(), y, 0), 0);
-    TIFFClose(tiff);
-  }
+  RawTiff shape(32, 16, 8, 3, PHOTOMETRIC_YCBCR);
+  shape.compression = COMPRESSION_JPEG;
+  shape.strip = 16;
+  std::vector<uint32_t> values;
+  for (int i = 0; i < 32 * 16 * 3; ++i) values.push_back(colours[i / 3 % 32 / 16][i % 3]);
+  WriteRawTiff(folder.File("ycbcr.tif"), shape, values);
   auto rgb = ImageFile::Read(folder.File("ycbcr.tif"));
   ASSERT_EQ(rgb->Mode(), ImageMode::kRgb);
   for (int c = 0; c < 3; ++c) {

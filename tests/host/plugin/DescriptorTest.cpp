@@ -29,63 +29,40 @@ TEST(DescriptorTest, ByteFormIsTheDocumentedOne) {
   EXPECT_EQ(descriptor.ToBytes(), expected);
 }
 
-TEST(DescriptorTest, SuiteRoundTripThroughHandleKeepsValuesAndKeyOrder) {
+// What the filter's descriptor tests through this suite do not reach: a key
+// put again, data whose length is no multiple of four, empty data, and the
+// codes of failed lookups.
+TEST(DescriptorTest, SuiteRoundTripThroughAHandleKeepsValuesAndKeyOrder) {
   const Tarsa::HostDescriptorSuite* suite = DescriptorSuite::Table();
   std::vector<uint8_t> blob(301);
   for (size_t i = 0; i < blob.size(); ++i) blob[i] = static_cast<uint8_t>(i * 7);
-
   Tarsa::HostDescriptor made = nullptr;
   ASSERT_EQ(suite->make(&made), 0);
-  ASSERT_EQ(suite->putInteger(made, FourCC("zeta"), -7), 0);
   ASSERT_EQ(suite->putFloat(made, FourCC("alph"), 0.1), 0);
-  ASSERT_EQ(suite->putEnumerated(made, FourCC("mid "), FourCC("prjM"), FourCC("fisP")), 0);
   ASSERT_EQ(suite->putData(made, FourCC("blob"), static_cast<int32_t>(blob.size()), blob.data()),
             0);
   ASSERT_EQ(suite->putData(made, FourCC("none"), 0, nullptr), 0);
-  // Putting a key again replaces its value where it stands.
-  ASSERT_EQ(suite->putFloat(made, FourCC("alph"), -2.5e-300), 0);
+  ASSERT_EQ(suite->putFloat(made, FourCC("alph"), -2.5e-300), 0);  // replaced where it stands
   Tarsa::HostHandle handle = nullptr;
   ASSERT_EQ(suite->asHandle(made, &handle), 0);
   suite->free(made);
-
-  Tarsa::HostDescriptor read = nullptr;
-  ASSERT_EQ(suite->fromHandle(handle, &read), 0);
+  Tarsa::HostDescriptor held = nullptr;
+  ASSERT_EQ(suite->fromHandle(handle, &held), 0);
   MemoryHandles::Dispose(handle);
-  uint32_t count = 0;
-  ASSERT_EQ(suite->count(read, &count), 0);
-  EXPECT_EQ(count, 5u);
-  const uint32_t order[] = {FourCC("zeta"), FourCC("alph"), FourCC("mid "), FourCC("blob"),
-                            FourCC("none")};
-  for (uint32_t i = 0; i < 5; ++i) {
-    uint32_t key = 0;
-    ASSERT_EQ(suite->keyAt(read, i, &key), 0);
-    EXPECT_EQ(key, order[i]) << i;
-  }
-  uint32_t key = 0;
-  EXPECT_NE(suite->keyAt(read, 5, &key), 0);
+  const Descriptor& read = *DescriptorSuite::Of(held);
+  ASSERT_EQ(read.Count(), 3u);
+  EXPECT_EQ(read.Items()[0].key, FourCC("alph"));
+  EXPECT_EQ(read.Items()[0].number, -2.5e-300);
+  EXPECT_EQ(read.Find(FourCC("blob"))->data, blob);
+  EXPECT_TRUE(read.Find(FourCC("none"))->data.empty());
 
+  uint32_t key = 0;
   int32_t integer = 0;
   double number = 0;
-  uint32_t type = 0, value = 0;
-  int32_t length = -1;
-  EXPECT_EQ(suite->getInteger(read, FourCC("zeta"), &integer), 0);
-  EXPECT_EQ(integer, -7);
-  EXPECT_EQ(suite->getFloat(read, FourCC("alph"), &number), 0);
-  EXPECT_EQ(number, -2.5e-300);
-  EXPECT_EQ(suite->getEnumerated(read, FourCC("mid "), &type, &value), 0);
-  EXPECT_EQ(type, FourCC("prjM"));
-  EXPECT_EQ(value, FourCC("fisP"));
-  EXPECT_EQ(suite->getDataLength(read, FourCC("blob"), &length), 0);
-  ASSERT_EQ(length, 301);
-  std::vector<uint8_t> bytes(301);
-  EXPECT_EQ(suite->getData(read, FourCC("blob"), bytes.data()), 0);
-  EXPECT_EQ(bytes, blob);
-  EXPECT_EQ(suite->getDataLength(read, FourCC("none"), &length), 0);
-  EXPECT_EQ(length, 0);
-
-  EXPECT_EQ(suite->getInteger(read, FourCC("alph"), &integer), HostCodes::kWrongType);
-  EXPECT_EQ(suite->getFloat(read, FourCC("gone"), &number), HostCodes::kNoSuchKey);
-  suite->free(read);
+  EXPECT_NE(suite->keyAt(held, 3, &key), 0);
+  EXPECT_EQ(suite->getInteger(held, FourCC("alph"), &integer), HostCodes::kWrongType);
+  EXPECT_EQ(suite->getFloat(held, FourCC("gone"), &number), HostCodes::kNoSuchKey);
+  suite->free(held);
 }
 
 TEST(DescriptorTest, DamagedBytesAreRefused) {
