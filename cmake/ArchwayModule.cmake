@@ -4,8 +4,10 @@
 # UndefinedBehaviorSanitizer, so that one ctest run covers both.
 
 set(ARCHWAY_WARNINGS -Wall -Wextra -Werror)
+# -O1 with line tables keeps the sanitizer variant quick to build while its
+# reports still name files and lines.
 set(ARCHWAY_SAN_FLAGS -fsanitize=address,undefined -fno-sanitize-recover=all
-    -fno-omit-frame-pointer)
+    -fno-omit-frame-pointer -O1 -g1)
 
 # archway_library(NAME <name> DIRS <dir>... [DEPENDS <our libs>...]
 #                 [SYSTEM <imported targets or flags>...])
