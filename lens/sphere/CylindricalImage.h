@@ -1,23 +1,17 @@
 #pragma once
 
-#include "lens/sphere/PhotoToSphere.h"
+#include "lens/sphere/CentredFocalImage.h"
 
 namespace Project {
 
 // A cylindrical panorama: longitude runs linearly along x, y = focal tan(lat).
-class CylindricalImage : public PhotoToSphere {
+class CylindricalImage : public CentredFocalImage {
  public:
   // focal in pixels; the centre in pixels from the top left corner.
   CylindricalImage(std::shared_ptr<const Image> image, float focal, float centerX, float centerY);
 
-  bool Contains(float lon, float lat) const override;
   void GetPosition(float lon, float lat, float& x, float& y) const override;
   bool WalksToCentre() const override { return false; }
-
- private:
-  const float focal_;
-  const float offsetX_;  // the centre's offset from the middle, y upwards
-  const float offsetY_;
 };
 
 }  // namespace Project

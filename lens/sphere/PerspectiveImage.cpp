@@ -6,10 +6,7 @@ namespace Project {
 
 PerspectiveImage::PerspectiveImage(std::shared_ptr<const Image> image, float focal, float centerX,
                                    float centerY)
-    : PhotoToSphere(std::move(image)),
-      focal_(focal),
-      offsetX_(centerX - GetImage()->width * 0.5f),
-      offsetY_(GetImage()->height * 0.5f - centerY) {}
+    : CentredFocalImage(std::move(image), focal, centerX, centerY) {}
 
 // Only the half sphere in front projects; latitude is free.
 bool PerspectiveImage::Contains(float lon, float /*lat*/) const {

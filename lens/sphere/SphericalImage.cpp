@@ -6,17 +6,7 @@ namespace Project {
 
 SphericalImage::SphericalImage(std::shared_ptr<const Image> image, float focal, float centerX,
                                float centerY)
-    : PhotoToSphere(std::move(image)),
-      focal_(focal),
-      offsetX_(centerX - GetImage()->width * 0.5f),
-      offsetY_(GetImage()->height * 0.5f - centerY) {}
-
-bool SphericalImage::Contains(float lon, float lat) const {
-  float x = 0.0f;
-  float y = 0.0f;
-  GetPosition(lon, lat, x, y);
-  return ContainsPixel(x, y);
-}
+    : CentredFocalImage(std::move(image), focal, centerX, centerY) {}
 
 void SphericalImage::GetPosition(float lon, float lat, float& x, float& y) const {
   x = focal_ * lon + offsetX_;
