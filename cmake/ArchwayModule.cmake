@@ -9,15 +9,19 @@ set(ARCHWAY_WARNINGS -Wall -Wextra -Werror)
 set(ARCHWAY_SAN_FLAGS -fsanitize=address,undefined -fno-sanitize-recover=all
     -fno-omit-frame-pointer -O1 -g1)
 
-# archway_library(NAME <name> DIRS <dir>... [DEPENDS <our libs>...]
-#                 [SYSTEM <imported targets or flags>...])
-# Sources are all .cpp files below the given folders.
+# archway_library(NAME <name> DIRS <dir>... [EXCLUDE <dir>...]
+#                 [DEPENDS <our libs>...] [SYSTEM <imported targets or flags>...])
+# Sources are all .cpp files below the given folders, less those below the
+# excluded ones (a subfolder that is a library of its own).
 function(archway_library)
-  cmake_parse_arguments(A "" "NAME" "DIRS;DEPENDS;SYSTEM" ${ARGN})
+  cmake_parse_arguments(A "" "NAME" "DIRS;EXCLUDE;DEPENDS;SYSTEM" ${ARGN})
   set(sources)
   foreach(dir ${A_DIRS})
     file(GLOB_RECURSE found CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/${dir}/*.cpp)
     list(APPEND sources ${found})
+  endforeach()
+  foreach(dir ${A_EXCLUDE})
+    list(FILTER sources EXCLUDE REGEX "^${PROJECT_SOURCE_DIR}/${dir}/")
   endforeach()
   foreach(variant "" "_san")
     if(variant STREQUAL "_san" AND NOT ARCHWAY_SANITIZE)

@@ -11,6 +11,7 @@ packages=(
   libsdl2-dev
   libexiv2-dev
   libexempi-dev
+  libsuitesparse-dev libopenblas-dev libtbb-dev
 )
 
 missing=()
