@@ -1,7 +1,6 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <functional>
 #include <memory>
 #include <numbers>
 #include <random>
@@ -18,6 +17,7 @@
 #include "lens/sphere/OrvanePerspective.h"
 #include "lens/sphere/PerspectiveImage.h"
 #include "lens/sphere/SphericalImage.h"
+#include "tools/synth/lib/Projection.h"
 
 namespace Project {
 namespace {
@@ -25,99 +25,114 @@ namespace {
 constexpr int kWidth = 640;
 constexpr int kHeight = 480;
 
-struct Direction {
-  double x, y, z;  // x the view axis, y towards positive longitude, z up
-};
-
-Direction FromAngles(double lon, double lat) {
-  return {std::cos(lat) * std::cos(lon), std::cos(lat) * std::sin(lon), std::sin(lat)};
-}
-
-// One model and, written from its geometry on the direction vector, the
-// centred image position (y upwards) that it should give.
-struct Case {
+// One model and the generator's projection of the same camera. The
+// generator's cameras have square pixels; a profile's unequal focal lengths
+// stretch the picture along x by focalX / focalY about the optical centre.
+// Directions are drawn with lon and lat within plus or minus the limits.
+struct GeneratorCase {
   std::string name;
   std::shared_ptr<PhotoToSphere> model;
-  std::function<void(const Direction&, double&, double&)> expected;
+  Synth::Projection generator;
+  double stretchX;
+  float lonLimit;
+  float latLimit;
 };
 
-std::vector<Case> Cases(const std::shared_ptr<const Image>& image) {
-  std::vector<Case> cases;
-  // Equisolid fisheye: radius 2 f sin(t / 2) at angle t from the axis.
-  cases.push_back({"FisheyeImage", std::make_shared<FisheyeImage>(image, 300.0f, 1.0f, 2.0f),
-                   [](const Direction& d, double& x, double& y) {
-                     const double side = std::hypot(d.y, d.z);
-                     const double r = 2 * 300.0 * std::sin(std::atan2(side, d.x) / 2);
-                     x = r * d.y / side;
-                     y = r * d.z / side;
-                   }});
-  // Pinhole about a centre at (300, 250) px from the top left.
-  cases.push_back({"PerspectiveImage",
-                   std::make_shared<PerspectiveImage>(image, 400.0f, 300.0f, 250.0f),
-                   [](const Direction& d, double& x, double& y) {
-                     x = 400.0 * d.y / d.x - 20.0;
-                     y = 400.0 * d.z / d.x - 10.0;
-                   }});
-  // Cylinder of radius f about the vertical axis, unrolled.
-  cases.push_back({"CylindricalImage",
-                   std::make_shared<CylindricalImage>(image, 200.0f, 330.0f, 230.0f),
-                   [](const Direction& d, double& x, double& y) {
-                     x = 200.0 * std::atan2(d.y, d.x) + 10.0;
-                     y = 200.0 * d.z / std::hypot(d.x, d.y) + 10.0;
-                   }});
-  // Equirectangular.
+std::vector<GeneratorCase> GeneratorCases() {
+  // Odd sides: the picture's middle is then half a pixel off any pixel
+  // corner, so halving the width in integers would show.
+  const int w = 641, h = 481;
+  const auto image = std::make_shared<const Image>(w, h);
+  const double m = w;  // the longer side, the profile's unit
+  using Synth::ProjectionKind;
+  std::vector<GeneratorCase> cases;
+  // The equisolid fisheye ignores the centre it is given: it projects about
+  // the middle. Its whole domain is the front half sphere.
+  cases.push_back({"FisheyeImage", std::make_shared<FisheyeImage>(image, 250.0f, 1.0f, 2.0f),
+                   Synth::Projection(ProjectionKind::kFisheyeEquisolid, 250.0, {w / 2.0, h / 2.0}),
+                   1.0, 1.57f, 1.57f});
+  // Model and generator both take the centre in pixels from the top left,
+  // y downwards. The pinhole domain runs on towards 1.57 rad, where positions
+  // reach a thousand focal lengths and single precision cannot hold 1e-4 of
+  // the picture; at 1.3 rad they are already 13 focal lengths out.
+  cases.push_back(
+      {"PerspectiveImage", std::make_shared<PerspectiveImage>(image, 400.0f, 300.5f, 250.25f),
+       Synth::Projection(ProjectionKind::kRectilinear, 400.0, {300.5, 250.25}), 1.0, 1.3f, 1.3f});
+  cases.push_back(
+      {"CylindricalImage", std::make_shared<CylindricalImage>(image, 200.0f, 330.0f, 230.0f),
+       Synth::Projection(ProjectionKind::kCylindrical, 200.0, {330.0, 230.0}), 1.0, 3.1f, 1.3f});
   cases.push_back({"SphericalImage",
                    std::make_shared<SphericalImage>(image, 150.0f, 320.0f, 250.0f),
-                   [](const Direction& d, double& x, double& y) {
-                     x = 150.0 * std::atan2(d.y, d.x);
-                     y = 150.0 * std::asin(d.z) - 10.0;
-                   }});
-  // Profile fisheye: equidistant with odd polynomial, focal and centre in
-  // units of the longer side (640 px); the offsets are added.
-  cases.push_back(
-      {"OrvaneFisheye",
-       std::make_shared<OrvaneFisheye>(image, 0.25f, 0.27f, 0.52f, 0.47f, -0.02f, 0.003f),
-       [](const Direction& d, double& x, double& y) {
-         const double side = std::hypot(d.y, d.z);
-         const double t = std::atan2(side, d.x);
-         const double p = t - 0.02 * std::pow(t, 3) + 0.003 * std::pow(t, 5);
-         x = 640 * double(0.25f) * p * d.y / side + 640 * (double(0.52f) - 0.5);
-         y = 640 * double(0.27f) * p * d.z / side + 640 * (0.5 - double(0.47f));
-       }});
-  // Profile rectilinear: Brown-Conrady on the pinhole plane; the offsets are
-  // subtracted.
-  cases.push_back({"OrvanePerspective",
-                   std::make_shared<OrvanePerspective>(image, 0.8f, 0.82f, 0.6f, 0.45f, -0.05f,
-                                                       0.01f, -0.002f, 0.003f, -0.004f),
-                   [](const Direction& d, double& x, double& y) {
-                     const double u = d.y / d.x, v = d.z / d.x, r2 = u * u + v * v;
-                     const double k1 = double(-0.05f), k2 = double(0.01f), k3 = double(-0.002f);
-                     const double t1 = double(0.003f), t2 = double(-0.004f);
-                     const double f = 1 + k1 * r2 + k2 * r2 * r2 + k3 * r2 * r2 * r2;
-                     const double bx = u * f + 2 * t1 * u * v + t2 * (r2 + 2 * u * u);
-                     const double by = v * f + t1 * (r2 + 2 * v * v) + 2 * t2 * u * v;
-                     x = 640 * double(0.8f) * bx - 640 * (double(0.6f) - 0.5);
-                     y = 640 * double(0.82f) * by - 640 * (0.5 - double(0.45f));
-                   }});
+                   Synth::Projection(ProjectionKind::kEquirectangular, 150.0, {320.0, 250.0}), 1.0,
+                   3.1f, 1.57f});
+
+  // The profile models come from lens profile camera models through the
+  // chooser, their focal lengths times the crop ratio. Profile centres are
+  // fractions of the sides from the top left, scaled by the longer side.
+  constexpr float kCrop = 1.25f;
+  std::shared_ptr<PhotoToSphere> model;
+  PFisheyeCameraModel fisheye;
+  fisheye.centerX = 0.52f;
+  fisheye.centerY = 0.47f;
+  fisheye.focalX = 0.25f;
+  fisheye.focalY = 0.27f;
+  fisheye.radial1 = -0.04f;
+  fisheye.radial2 = 0.004f;
+  EXPECT_TRUE(ChoosePhotoToSphere(3, image, 0.0f, nullptr, &fisheye, kCrop, model));
+  cases.push_back({"OrvaneFisheye", model,
+                   Synth::Projection(ProjectionKind::kFisheyePoly, m * fisheye.focalY * kCrop,
+                                     {w / 2.0 + (fisheye.centerX - 0.5) * m,
+                                      h / 2.0 + (fisheye.centerY - 0.5) * m},
+                                     {fisheye.radial1, fisheye.radial2}),
+                   double(fisheye.focalX) / fisheye.focalY, 1.57f, 1.57f});
+
+  // The rectilinear profile subtracts its centre's offsets, so the
+  // generator's centre is the profile's mirrored about the middle. Its terms
+  // never fold (the radial slope stays positive); within 1 rad, positions stay
+  // within a few pictures of the middle.
+  PTangentialDistortCameraModel pinhole;
+  pinhole.centerX = 0.6f;
+  pinhole.centerY = 0.45f;
+  pinhole.focalX = 0.5f;
+  pinhole.focalY = 0.56f;
+  pinhole.radial1 = -0.12f;
+  pinhole.radial2 = 0.02f;
+  pinhole.radial3 = 0.001f;
+  pinhole.tangential1 = 0.004f;
+  pinhole.tangential2 = -0.003f;
+  EXPECT_TRUE(ChoosePhotoToSphere(3, image, 0.0f, nullptr, &pinhole, kCrop, model));
+  cases.push_back({"OrvanePerspective", model,
+                   Synth::Projection(ProjectionKind::kTangential, m * pinhole.focalY * kCrop,
+                                     {w / 2.0 - (pinhole.centerX - 0.5) * m,
+                                      h / 2.0 - (pinhole.centerY - 0.5) * m},
+                                     {pinhole.radial1, pinhole.radial2, pinhole.radial3,
+                                      pinhole.tangential1, pinhole.tangential2}),
+                   double(pinhole.focalX) / pinhole.focalY, 1.0f, 1.0f});
   return cases;
 }
 
-TEST(SphereModelTest, TexCoordMatchesAnIndependentProjection) {
-  const auto image = std::make_shared<const Image>(kWidth, kHeight);
+TEST(SphereModelTest, TexCoordMatchesTheGenerator) {
   std::mt19937 rng(3);
-  std::uniform_real_distribution<float> angle(-1.0f, 1.0f);
-  for (const Case& c : Cases(image)) {
+  for (const GeneratorCase& c : GeneratorCases()) {
     SCOPED_TRACE(c.name);
-    for (int i = 0; i < 200; ++i) {
-      const float lon = angle(rng), lat = angle(rng);
-      double x = 0, y = 0;
-      c.expected(FromAngles(lon, lat), x, y);
+    const Image& image = *c.model->GetImage();
+    std::uniform_real_distribution<float> lonOf(-c.lonLimit, c.lonLimit);
+    std::uniform_real_distribution<float> latOf(-c.latLimit, c.latLimit);
+    for (int i = 0; i < 500; ++i) {
+      const float lon = lonOf(rng), lat = latOf(rng);
+      Synth::Point2 p;
+      ASSERT_TRUE(c.generator.ToImage(Synth::DirectionOf(lon, lat), &p)) << lon << " " << lat;
+      const double x = c.generator.Centre().x + (p.x - c.generator.Centre().x) * c.stretchX;
       float uv[2] = {0, 0};
       c.model->GetTexCoord(lon, lat, uv);
-      // Positions are single precision throughout; 1e-6 of the width is
-      // under a thousandth of a pixel.
-      EXPECT_NEAR(uv[0], x / kWidth + 0.5, 1e-6);
-      EXPECT_NEAR(uv[1], y / kHeight + 0.5, 1e-6);
+      // The generator's positions run from the top left corner with y
+      // downwards, pixel i covering [i, i + 1): its texture fraction is
+      // (x / W, 1 - y / H), the same edge-to-edge span as the model's, whose
+      // v grows upwards. Tolerance: the accepted agreement, 1e-4 in texture
+      // units (a fraction of the picture's side); single-precision positions
+      // a few pictures out account for at most 2e-6 of it.
+      EXPECT_NEAR(uv[0], x / image.width, 1e-4);
+      EXPECT_NEAR(uv[1], 1.0 - p.y / image.height, 1e-4);
     }
   }
 }
