@@ -1,0 +1,130 @@
+#pragma once
+
+#include <atomic>
+#include <cstdint>
+#include <memory>
+#include <vector>
+
+#include "lens/sphere/PhotoToSphere.h"
+#include "solver/grid/OctaMap.h"
+#include "solver/sparse/CompressedMatrix.h"
+#include "solver/sparse/EliminationOrder.h"
+#include "solver/sparse/SparseBuilder.h"
+#include "solver/warp/ClosedFormWarp.h"
+#include "solver/warp/SphereWarp.h"
+
+namespace Project {
+
+// The settings an iterative warp is built with, in one place.
+struct IterativeWarpSettings {
+  float regularWeight = 0.001f;
+  std::int32_t iterationCount = 8;
+  bool cachePermutation = false;
+  bool highCenterWeight = false;
+  std::int32_t warpModel = 3;
+  std::int32_t borderExpand = 1;
+  bool anchorBorderOnly = true;
+  bool useGaussNewton = true;
+  bool usePardiso = true;
+  bool isLimited = false;
+  float latMin = 0.0f;
+  float latMax = 0.0f;
+  float lonMin = 0.0f;
+  float lonMax = 0.0f;
+};
+
+// The warp as the minimum of a quadratic energy over the (u, v) of every
+// grid vertex. The constant part (anchors to a closed-form regulariser, and
+// whatever conformal and smoothness terms a subclass adds) is assembled once;
+// a subclass adds the iteration part afresh each iteration, and each
+// iteration solves one sparse symmetric positive-definite system.
+//
+// Owns its two builders, the compressed constant part, the solution and the
+// cached elimination order; shares the grid and the image model with the
+// Solver, and owns the regulariser it builds from the model value.
+class IterativeWarpSolver : public SphereWarp {
+ public:
+  IterativeWarpSolver(std::shared_ptr<const OctaMap> octaMap,
+                      std::shared_ptr<const PhotoToSphere> imageModel,
+                      const IterativeWarpSettings& settings);
+
+  bool IsVertexInside(std::int32_t i, std::int32_t j) const override;
+  bool IsQuadInside(std::int32_t i, std::int32_t j) const override;
+  void GetVertexPosition(std::int32_t i, std::int32_t j, float& outU, float& outV) const override;
+  void Solve() override;
+  bool Succeeded() const override { return succeeded_; }
+  // Reassembles the constant part, whose frames follow the grid's rotation.
+  void Reset() override;
+
+  // The half of a folded border that has no unknowns of its own is mapped to
+  // its twin.
+  void FoldVertex(std::int32_t& i, std::int32_t& j) const;
+  // One step across the grid, over the fold.
+  void StepVertex(std::int32_t& i, std::int32_t& j, std::int32_t di, std::int32_t dj) const;
+  // The index of the vertex's u unknown (v follows), after folding.
+  std::int32_t UnknownOf(std::int32_t i, std::int32_t j) const;
+
+  // Reporting aids: the anchors' energy at the current solution, and the
+  // constraint terms' (zero here).
+  virtual double TotalEnergy() const;
+  virtual double ConstraintEnergy() const { return 0.0; }
+
+  const std::vector<double>& Solution() const { return solution_; }
+  std::int32_t UnknownCount() const { return unknownCount_; }
+  const CompressedMatrix& ConstantMatrix() const { return *constantMatrix_; }
+  const std::vector<double>& ConstantRhs() const { return constantRhs_; }
+  const EliminationOrder& Order() const { return order_; }
+  // Solves done by the last Solve(), for the benchmarks and tests.
+  std::int32_t IterationsRun() const { return iterationsRun_; }
+
+ protected:
+  // The constant part; subclasses call it once their own fields are set,
+  // since it reaches their terms.
+  void AssembleConstantPart();
+  // A least-squares row with coefficients c on unknowns q and residual r:
+  // its normal-equation entries go to builder (upper triangle) and, when rhs
+  // is given, -r c to rhs.
+  static void AddRow(SparseBuilder& builder, const std::int32_t* q, const double* c, std::int32_t n,
+                     double r, std::vector<double>* rhs);
+
+  virtual void AddConformalQuad(std::int32_t /*i*/, std::int32_t /*j*/) {}
+  virtual void AddSmoothnessVertex(std::int32_t /*i*/, std::int32_t /*j*/) {}
+  virtual void AddIterationTerms(std::int32_t /*iteration*/) {}
+  virtual void PrepareGaussNewton() {}
+  // Below 0: not yet measurable; the loop stops once it is below 0.005.
+  virtual double ConvergenceMeasure() { return -1.0; }
+
+  // Resizes the system to unknowns, keeping what it holds.
+  void ResizeUnknowns(std::int32_t unknowns);
+  // Whether the vertex is on the half of a folded border without unknowns.
+  bool IsFoldedHalf(std::int32_t i, std::int32_t j) const;
+
+  const std::shared_ptr<const OctaMap> octaMap_;
+  const std::shared_ptr<const PhotoToSphere> imageModel_;
+  const IterativeWarpSettings settings_;
+  const std::unique_ptr<ClosedFormWarp> regularizer_;
+  const std::int32_t gridSize_;
+  const std::int32_t vertexCount_;
+  const std::int32_t halfGrid_;
+  std::int32_t unknownCount_;
+  SparseBuilder constantBuilder_;
+  SparseBuilder iterationBuilder_;
+  std::unique_ptr<CompressedMatrix> constantMatrix_;
+  std::vector<double> solution_;
+  std::vector<double> constantRhs_;
+  std::vector<double> iterationRhs_;
+  EliminationOrder order_;
+  bool succeeded_ = true;
+  std::int32_t iterationsRun_ = 0;
+
+ private:
+  bool ComputeVertexInside(std::int32_t i, std::int32_t j, bool& cache) const;
+  bool InsideLimits(float lat, float lon) const;
+  bool TexCoordInPicture(std::int32_t i, std::int32_t j) const;
+
+  // Per vertex, index i * N + j: 0 unknown, 1 inside, 2 outside. Written
+  // from the quad finder's workers too; every writer stores the same value.
+  mutable std::vector<std::atomic<std::uint8_t>> vertexState_;
+};
+
+}  // namespace Project
