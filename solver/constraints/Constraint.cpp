@@ -1,0 +1,70 @@
+#include "solver/constraints/Constraint.h"
+
+#include <cmath>
+
+#include "filter/params/PSettings.h"
+#include "solver/frame/SolverContext.h"
+
+namespace Project {
+
+bool ConstraintEnv::ShowsResult() const { return context.Settings().previewResult != 0; }
+
+void ScreenBounds::Merge(const ScreenBounds& other) {
+  if (other.IsEmpty()) return;
+  if (IsEmpty()) {
+    *this = other;
+    return;
+  }
+  Widen({other.left, other.top});
+  Widen({other.right, other.bottom});
+}
+
+ConstraintLook LookOf(const LineRecord& record) {
+  if (!record.active) return ConstraintLook::kInvalid;
+  if (!record.hasFixedNormal) return ConstraintLook::kOrdinary;
+  if (record.fixedNormal[0] == 0.0f && record.fixedNormal[1] == 1.0f) {
+    return ConstraintLook::kHorizontal;
+  }
+  if (record.fixedNormal[0] == 1.0f && record.fixedNormal[1] == 0.0f) {
+    return ConstraintLook::kVertical;
+  }
+  return ConstraintLook::kFixed;
+}
+
+std::uint32_t ColorOf(ConstraintLook look, const PSettings& settings) {
+  switch (look) {
+    case ConstraintLook::kOrdinary:
+      return settings.colorUnfixed;
+    case ConstraintLook::kHorizontal:
+      return settings.colorHorizontal;
+    case ConstraintLook::kVertical:
+      return settings.colorVertical;
+    case ConstraintLook::kFixed:
+      return settings.colorFixed;
+    case ConstraintLook::kInvalid:
+      break;
+  }
+  return settings.colorInvalid;
+}
+
+float SegmentDistanceSquared(Point2f p, Point2f a, Point2f b) {
+  const float dx = b.x - a.x, dy = b.y - a.y;
+  const float length2 = dx * dx + dy * dy;
+  const float s = (p.x - a.x) * dx + (p.y - a.y) * dy;
+  Point2f foot = a;
+  if (length2 == 0.0f || s <= 0.0f) {
+    foot = a;
+  } else if (s > length2) {
+    foot = b;
+  } else {
+    foot = {a.x + dx * s / length2, a.y + dy * s / length2};
+  }
+  const float fx = foot.x - p.x, fy = foot.y - p.y;
+  return fx * fx + fy * fy;
+}
+
+bool InSquare(Point2f p, Point2f centre, float tolerance) {
+  return std::fabs(p.x - centre.x) <= tolerance && std::fabs(p.y - centre.y) <= tolerance;
+}
+
+}  // namespace Project
