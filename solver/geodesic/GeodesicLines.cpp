@@ -17,6 +17,17 @@ namespace Project {
 
 namespace {
 
+// A line that starts exactly on a cell's edge may have been found in the
+// cell on the far side, where the only crossing is the start itself, at the
+// full angle. In the first cell a crossing that ties with the start counts
+// as progress, so the walk steps over into the cell the line runs through;
+// any crossing truly nearer the end still wins. The slack is far above the
+// rounding of two computations of one point and far below a cell's angle.
+constexpr double kStartSlack = 1e-9;
+double StartSlack(const OctaMap::Cell& cell, const OctaMap::Cell& cellFrom) {
+  return cell == cellFrom ? kStartSlack : 0.0;
+}
+
 // The finder cuts the cell rows into this many bands.
 constexpr unsigned kBands = 16;
 // Below this |n . D| an edge runs along the circle's plane and is not cut.
@@ -308,7 +319,7 @@ void GeodesicLines::WalkCells(LineRecord& line, const float from[2], const float
       xSum += plane[2 * k] + f * (plane[2 * k1] - plane[2 * k]);
       ySum += plane[2 * k + 1] + f * (plane[2 * k1 + 1] - plane[2 * k + 1]);
       ++hits;
-      if (angle < best) {
+      if (angle < best + StartSlack(cell, cellFrom)) {
         best = angle;
         next = octaMap_->NeighbourCell(cell, k);
         moved = true;
@@ -381,7 +392,7 @@ void GeodesicLines::WalkCellsTriangles(LineRecord& line, const float from[2], co
       const Vec3 p = corners[k];
       if (!CutEdge(n, p, corners[k1] - p, f)) continue;
       const double angle = AngleBetween(endB, p + f * (corners[k1] - p));
-      if (angle < best) {
+      if (angle < best + StartSlack(cell, cellFrom)) {
         best = angle;
         next = octaMap_->NeighbourCell(cell, k);
         moved = true;

@@ -136,6 +136,33 @@ TEST(TraceTest, KeptEndsAndFailures) {
   EXPECT_EQ(point.samples.size(), 2u);
 }
 
+// A line starting exactly on a cell edge (the meridian through the view
+// axis is the grid column i = h) walks on from either cell holding that edge.
+TEST(TraceTest, StartOnACellEdgeWalksFromEitherCell) {
+  for (bool triangles : {false, true}) {
+    GeodesicScene scene(6, triangles, WideFisheye());
+    const Point2f a = scene.Fraction(0.0, 0.3), b = scene.Fraction(0.6, -0.2);
+    ASSERT_EQ(a.x, 0.5f);
+    const float from[2] = {a.x, a.y}, to[2] = {b.x, b.y};
+    OctaMap::Cell found, cellTo;
+    ASSERT_TRUE(scene.lines->FindCell(from, found, 0));
+    ASSERT_TRUE(scene.lines->FindCell(to, cellTo, 0));
+    const int h = scene.map->Half();
+    for (int i : {h - 1, h}) {
+      LineRecord line;
+      const OctaMap::Cell start{i, found.j};
+      if (triangles) {
+        scene.lines->WalkCellsTriangles(line, from, to, start, cellTo, 0);
+      } else {
+        scene.lines->WalkCells(line, from, to, start, cellTo, 0);
+      }
+      EXPECT_TRUE(line.active) << triangles << " " << i;
+      // About 0.7 rad at 2.5 degrees a cell: a couple of dozen cells.
+      EXPECT_GT(line.samples.size(), 10u) << triangles << " " << i;
+    }
+  }
+}
+
 // A point near an arc snaps onto the great circle; one 200 pixels away is
 // refused.
 TEST(TraceTest, SnapToArcLandsOnTheCircle) {
