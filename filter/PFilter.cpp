@@ -13,6 +13,8 @@
 #include "framework/process/CReporter.h"
 #include "lens/metadata/PXmpMeta.h"
 #include "lens/sphere/ChoosePhotoToSphere.h"
+#include "solver/constraints/ConstraintBlobAdapter.h"
+#include "solver/frame/Solver.h"
 
 namespace Project {
 
@@ -52,8 +54,6 @@ constexpr const char* kInvalidFullSphericalText =
     "$$$/Archway/Warning/InvalidFullSphericalRatio=The aspect ratio is not 1:2, which is invalid "
     "for Full Spherical.";
 
-constexpr const char* kSolverMissingText =
-    "$$$/Archway/Error/SolverMissing=This build of Archway cannot solve corrections yet.";
 constexpr const char* kDialogMissingText =
     "$$$/Archway/Error/DialogMissing=This build of Archway cannot open its workspace yet.";
 
@@ -246,9 +246,31 @@ void PFilter::EndRun() {
   CloseMetadata();
 }
 
-void PFilter::PrepareSolver() { throw Tarsa::CError(kSolverMissingText); }
+ConstraintList& PFilter::Constraints() {
+  if (constraints_ == nullptr) {
+    SolverContext& context = *this;
+    constraints_ = std::make_unique<ConstraintList>(context);
+  }
+  return *constraints_;
+}
 
-void PFilter::Solve() { throw Tarsa::CError(kSolverMissingText); }
+std::int32_t PFilter::SourceWidth() const {
+  return std::int32_t(std::clamp<std::int64_t>(ImageRect().Width(), 0, INT32_MAX));
+}
+
+std::int32_t PFilter::SourceHeight() const {
+  return std::int32_t(std::clamp<std::int64_t>(ImageRect().Height(), 0, INT32_MAX));
+}
+
+// A new grid and warp for the run's settings, then the bare mesh solved and
+// the constraints traced on it and solved.
+void PFilter::PrepareSolver() {
+  Solver& solver = Constraints().GetSolver();
+  solver.RebuildGrid(false);
+  solver.RefreshWarp(false);
+}
+
+void PFilter::Solve() { Constraints().GetSolver().Solve(true, false); }
 
 bool PFilter::RunDialog() { throw Tarsa::CError(kDialogMissingText); }
 
@@ -258,15 +280,20 @@ bool PFilter::ReadDescriptor(PSettings& target) {
   const Tarsa::HostFilterRecord* record = FilterRecord();
   if (record == nullptr || record->scriptBlock == nullptr) return false;
   const auto* script = static_cast<const Tarsa::HostScriptBlock*>(record->scriptBlock);
-  // The constraint bytes go to the constraint list once there is one.
   std::vector<std::uint8_t> constraintData;
-  return Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target, constraintData);
+  const bool read =
+      Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target, constraintData);
+  ConstraintBlobAdapter::ReadBlob(Constraints(), constraintData.data(), constraintData.size());
+  return read;
 }
 
 void PFilter::WriteDescriptor(const PSettings& source) {
   Tarsa::HostFilterRecord* record = FilterRecord();
   if (record == nullptr || record->scriptBlock == nullptr) return;
-  Tarsa::HostHandle handle = Project::WriteDescriptor(DescriptorSuite(), source, {});
+  const std::vector<std::uint8_t> blob = constraints_ != nullptr
+                                             ? ConstraintBlobAdapter::WriteBlob(*constraints_)
+                                             : std::vector<std::uint8_t>();
+  Tarsa::HostHandle handle = Project::WriteDescriptor(DescriptorSuite(), source, blob);
   if (handle != nullptr)
     static_cast<Tarsa::HostScriptBlock*>(record->scriptBlock)->descriptor = handle;
 }

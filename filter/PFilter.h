@@ -11,6 +11,8 @@
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/profiles/PLensMatcher.h"
 #include "lens/sphere/PhotoToSphere.h"
+#include "solver/constraints/ConstraintList.h"
+#include "solver/frame/SolverContext.h"
 
 namespace Project {
 
@@ -22,7 +24,7 @@ namespace Project {
 // and the preferences; the photo's metadata and the host's lens profile
 // suite are held for one run.
 // The rest of the program reaches it through Current().
-class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run {
+class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, private SolverContext {
  public:
   // What the photo's metadata says about its focal length; zero is absent.
   struct FocalData {
@@ -50,14 +52,18 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run {
 
   // The lazily made objects of a run.
   PImageHub& ImageHub();
-  PSettings& Settings();
+  PSettings& Settings() override;
+  // The constraint list, which owns the run's Solver; made at first use.
+  ConstraintList& Constraints();
+  // Whether the last solve failed, for the dialog's warning line.
+  bool SolveFailed() const { return solveFailed_ != 0; }
   // Loaded from the preferences directory unless Ctrl, Alt and Shift are
   // all held at the moment of making.
   PPreferences& Preferences();
   bool HasImageHub() const { return imageHub_ != nullptr; }
   bool HasPreferences() const { return preferences_ != nullptr; }
   // The photo's metadata; null outside a run's start.
-  const PhotoInfo* Photo() const { return photoInfo_.get(); }
+  const PhotoInfo* Photo() const override { return photoInfo_.get(); }
   bool Rendered() const { return rendered_ != 0; }
 
   // Where the filter's files live; empty when it cannot be had.
@@ -119,10 +125,27 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run {
   std::string& LensKey() override { return Settings().lensKey; }
   float LensCropRatio() override { return GetCropRatio(); }
 
+  // The solver's view of the run. Until a preview pane exists the preview
+  // is the image itself, so constraint points are image pixels.
+  std::int32_t SourceWidth() const override;
+  std::int32_t SourceHeight() const override;
+  std::int32_t PreviewWidth() const override { return SourceWidth(); }
+  std::int32_t PreviewHeight() const override { return SourceHeight(); }
+  bool BuildImageModel(const std::shared_ptr<const Image>& image,
+                       std::shared_ptr<PhotoToSphere>& model) override {
+    return ChooseSphereModel(image, model);
+  }
+  void ReportSolve(bool failed) override { solveFailed_ = failed ? 1 : 0; }
+  // The result panes come with the rendering; nothing shows a mesh yet.
+  void RebuildResults() override {}
+  void RedrawResults() override {}
+
   std::unique_ptr<PImageHub> imageHub_;
   std::unique_ptr<PSettings> settings_;
   std::unique_ptr<PPreferences> preferences_;
   std::unique_ptr<PhotoInfo> photoInfo_;
+  std::unique_ptr<ConstraintList> constraints_;
+  std::uint8_t solveFailed_ = 0;
   std::uint8_t rendered_ = 0;
   std::uint8_t metadataToolkitOpen_ = 0;
   const Tarsa::HostLensProfilesSuite* lensSuite_ = nullptr;

@@ -149,10 +149,10 @@ TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
 }
 
 // The run as far as this build goes: through the host, GPU and OpenGL checks,
-// preferences and settings, to the point where the solver would be prepared,
-// which throws. Needs a working OpenGL environment (a GPU or Mesa's software
+// preferences and settings and the solver's preparation (a real solve), to
+// the workspace, which throws. Needs a working OpenGL environment (a GPU or Mesa's software
 // renderer); without one the run is refused at the OpenGL check instead.
-TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
+TEST_F(FilterRun, InteractiveRunGoesUpToTheWorkspaceAndCleansUp) {
   static int prepared = 0;
   prepared = 0;
   const Tarsa::HostLensProfilesSuite lens{nullptr, nullptr, [] {
@@ -170,7 +170,7 @@ TEST_F(FilterRun, InteractiveRunGoesUpToTheSolverAndCleansUp) {
   if (shown.texts[0].find("OpenGL") != std::string::npos) {
     GTEST_SKIP() << "no OpenGL here: " << shown.texts[0];
   }
-  EXPECT_EQ(shown.texts[0], "This build of Archway cannot solve corrections yet.");
+  EXPECT_EQ(shown.texts[0], "This build of Archway cannot open its workspace yet.");
   EXPECT_EQ(host.propertyWrites.front(), std::make_pair(FourCC("wtch"), std::intptr_t(1)));
   EXPECT_EQ(host.Record()->flagByte94, 0);
   // Auto was forced, so the lens profiles were asked: the suite was taken,
