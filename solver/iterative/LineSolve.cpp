@@ -38,6 +38,9 @@ void LineSolve::AddSimilarityRows(double weight, Vertex a, Vertex b, Vertex c) {
   const double p1y = e1[0] * north[0] + e1[1] * north[1] + e1[2] * north[2];
   const double p2x = e2[0] * east[0] + e2[1] * east[1] + e2[2] * east[2];
   const double p2y = e2[0] * north[0] + e2[1] * north[1] + e2[2] * north[2];
+  // A step off the map's last row stops on the vertex itself: with no
+  // second edge there is no shape to keep.
+  if (p2x == 0.0 && p2y == 0.0) return;
   const double s = std::hypot(p1x, p1y) / std::hypot(p2x, p2y);
   const double d = std::atan2(p1y, p1x) - std::atan2(p2y, p2x);
   const double cs = s * std::cos(d), sn = s * std::sin(d);
