@@ -2,6 +2,8 @@
 
 #include <utility>
 
+#include "framework/memory/CVirtualHeap.h"
+
 namespace Tarsa {
 
 namespace {
@@ -19,9 +21,24 @@ CMemoryService* CMemoryService::Get(bool create) {
 
 void CMemoryService::Drop() { Service().reset(); }
 
+CMemoryService::CMemoryService() = default;
+
+CMemoryService::~CMemoryService() = default;
+
+void CMemoryService::SetMemoryLimit(std::uint64_t bytes) {
+  memoryLimit_ = bytes;
+  if (heap_) heap_->SetLimit(bytes);
+}
+
 void CMemoryService::StartSwap(std::vector<std::string> volumes) {
   scratchVolumes_ = std::move(volumes);
   swapStarted_ = true;
+  if (heap_) heap_->SetVolumes(scratchVolumes_);
+}
+
+CVirtualHeap& CMemoryService::Heap() {
+  if (!heap_) heap_ = std::make_unique<CVirtualHeap>(memoryLimit_, scratchVolumes_);
+  return *heap_;
 }
 
 }  // namespace Tarsa
