@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "tools/synth/lib/ActionWriter.h"
 #include "tools/synth/lib/CommandLine.h"
 #include "tools/synth/lib/PhotoWriter.h"
 #include "tools/synth/lib/Render.h"
@@ -26,6 +27,9 @@ int main(int argc, char** argv) {
     const Synth::RenderResult photo = Synth::Render(line.scene, line.camera);
     Synth::PhotoWriter::Write(photo, line.camera, line.output);
     if (!line.truth.empty()) Synth::TruthFile::Write(photo, line.truth);
+    if (!line.action.empty()) {
+      Synth::ActionWriter::Write(photo, line.camera, line.actionLines, line.action);
+    }
   } catch (const std::exception& error) {
     std::fprintf(stderr, "archway-synth: %s\n", error.what());
     return 1;

@@ -113,6 +113,9 @@ CommandLine CommandLine::Parse(const std::vector<std::string>& arguments) {
       {"-o", [&](const std::string&, const std::string& v) { line.output = v; }},
       {"--output", [&](const std::string&, const std::string& v) { line.output = v; }},
       {"--truth", [&](const std::string&, const std::string& v) { line.truth = v; }},
+      {"--action", [&](const std::string&, const std::string& v) { line.action = v; }},
+      {"--action-lines",
+       [&](const std::string& o, const std::string& v) { line.actionLines = ParseWhole(o, v); }},
   };
 
   for (size_t i = 0; i < arguments.size(); ++i) {
@@ -182,6 +185,12 @@ curves of the scene's visible straight edges.
   -o, --output FILE                the photograph
   --truth FILE                     the ground truth, one line per edge run:
                                    id x0 y0 z0 x1 y1 z1 n then n points x y
+  --action FILE                    an action that corrects the photograph:
+                                   its camera's model and focal length and
+                                   line constraints on the longest straight
+                                   edges, vertical ones marked vertical
+                                   (rectilinear and fisheye-equisolid only)
+  --action-lines N                 how many edges the action holds (6)
   -h, --help                       this text
 
 An equirectangular image spans 180 degrees over its height (2:1 for the

@@ -14,7 +14,9 @@ class CommandLine {
   SceneSpec scene;
   CameraSpec camera;
   std::string output;
-  std::string truth;  // empty: no ground truth file
+  std::string truth;   // empty: no ground truth file
+  std::string action;  // empty: no action file
+  int actionLines = 6;
 
   // Options take their value as the next argument or after '='. Throws
   // SynthError naming the fault.
