@@ -3,44 +3,25 @@
 #include <cmath>
 #include <memory>
 
-#include "lens/sphere/ChoosePhotoToSphere.h"
 #include "solver/constraints/ConstraintList.h"
 #include "solver/frame/Solver.h"
 #include "solver/frame/SolverContext.h"
 #include "solver/geodesic/Vec3.h"
+#include "tests/support/SolverTestContext.h"
 
 namespace Project {
 
-// The filter's side: real settings and the real choice of sphere model, a
-// photo of 1200 x 800 shown in a preview of 600 x 400.
-class SceneContext : public SolverContext {
+// The filter's side: a photo of 1200 x 800 shown in a preview of 600 x 400,
+// with the source shown so that curves come in photo pixels.
+class SceneContext : public SolverTestContext {
  public:
-  SceneContext(std::int32_t model, float focal) : settings(kWidth) {
-    settings.projectionModel = model;
-    settings.focalLength = focal;
+  SceneContext(std::int32_t model, float focal) : SolverTestContext(kWidth, kHeight, model, focal) {
     settings.regularizerModel = PSettings::kRegularizerStereographic;
-    settings.meshResolution = 5;
-    settings.autoRotate = 0;
-    settings.previewResult = 0;  // the source is shown: curves in photo pixels
+    settings.previewResult = 0;
   }
-  PSettings& Settings() override { return settings; }
-  const PhotoInfo* Photo() const override { return nullptr; }
-  std::int32_t SourceWidth() const override { return kWidth; }
-  std::int32_t SourceHeight() const override { return kHeight; }
-  std::int32_t PreviewWidth() const override { return kWidth / 2; }
-  std::int32_t PreviewHeight() const override { return kHeight / 2; }
-  bool BuildImageModel(const std::shared_ptr<const Image>& image,
-                       std::shared_ptr<PhotoToSphere>& model) override {
-    return ChoosePhotoToSphere(settings.projectionModel, image, settings.focalLength, nullptr,
-                               nullptr, 1.0f, model);
-  }
-  void ReportSolve(bool) override {}
-  void RebuildResults() override {}
-  void RedrawResults() override {}
 
   static constexpr std::int32_t kWidth = 1200;
   static constexpr std::int32_t kHeight = 800;
-  PSettings settings;
 };
 
 // A constraint list on a solved perspective photo (focal 700 pixels, about

@@ -5,42 +5,12 @@
 #include <cmath>
 #include <random>
 
-#include "lens/sphere/ChoosePhotoToSphere.h"
+#include "tests/support/SolverTestContext.h"
 
 namespace Project {
 namespace {
 
-// The filter's side, with real settings and the real choice of sphere model.
-class TestContext : public SolverContext {
- public:
-  TestContext(std::int32_t width, std::int32_t height, std::int32_t model, float focal)
-      : settings(width), width_(width), height_(height) {
-    settings.projectionModel = model;
-    settings.focalLength = focal;
-    settings.meshResolution = 5;
-    settings.autoRotate = 0;
-  }
-  PSettings& Settings() override { return settings; }
-  const PhotoInfo* Photo() const override { return nullptr; }
-  std::int32_t SourceWidth() const override { return width_; }
-  std::int32_t SourceHeight() const override { return height_; }
-  std::int32_t PreviewWidth() const override { return width_ / 2; }
-  std::int32_t PreviewHeight() const override { return height_ / 2; }
-  bool BuildImageModel(const std::shared_ptr<const Image>& image,
-                       std::shared_ptr<PhotoToSphere>& model) override {
-    return ChoosePhotoToSphere(settings.projectionModel, image, settings.focalLength, nullptr,
-                               nullptr, 1.0f, model);
-  }
-  void ReportSolve(bool failed) override { failures += failed ? 1 : 0; }
-  void RebuildResults() override { ++rebuilds; }
-  void RedrawResults() override { ++redraws; }
-
-  PSettings settings;
-  int failures = 0, rebuilds = 0, redraws = 0;
-
- private:
-  std::int32_t width_, height_;
-};
+using TestContext = SolverTestContext;
 
 // A solved perspective photo: the mesh, its boxes and every conversion,
 // each checked against its inverse or the mesh itself.
