@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstring>
 #include <limits>
 
 #include "lens/sphere/FisheyeImage.h"
@@ -264,8 +265,15 @@ void Solver::Solve(bool full, bool notify) {
   if (settings.autoRotate != 0) {
     float rotation[9];
     lines_->ComputeAutoRotation(rotation);
-    octaMap_->SetRotation(rotation);
-    warp_->Reset();
+    // The warp's constant part follows the grid's rotation; when the
+    // rotation stands as it was, reassembling it would rebuild the same
+    // system, so it is kept.
+    const bool unchanged = octaMap_->HasRotation() &&
+                           std::memcmp(rotation, octaMap_->Rotation(), sizeof rotation) == 0;
+    if (!unchanged) {
+      octaMap_->SetRotation(rotation);
+      warp_->Reset();
+    }
   }
   // While the source is shown, edits solve nothing.
   if (!full && settings.previewResult == 0) {

@@ -1,6 +1,7 @@
 #include "solver/iterative/IterativeWarpSolver.h"
 
 #include <algorithm>
+#include <chrono>
 #include <cmath>
 #include <utility>
 
@@ -14,6 +15,21 @@ constexpr float kLimitedSpan = 2.617994f;  // 150 degrees
 constexpr float kSeamStart = 2.792527f;    // 160 degrees
 constexpr float kTaperLat = 1.1623893f;    // 66.6 degrees
 constexpr double kConverged = 0.005;       // squared plane distance over all line ends
+
+using Clock = std::chrono::steady_clock;
+
+double SecondsSince(Clock::time_point start) {
+  return std::chrono::duration<double>(Clock::now() - start).count();
+}
+
+void AddStats(SolveProfile& profile, const SparseSolveStats& stats) {
+  profile.analyseSeconds += stats.analyseSeconds;
+  profile.factorSeconds += stats.factorSeconds;
+  profile.solveSeconds += stats.solveSeconds;
+  profile.peakBytes = std::max(profile.peakBytes, stats.peakBytes);
+  profile.factorNonzeros = stats.factorNonzeros;
+  profile.factorFlops = stats.factorFlops;
+}
 
 }  // namespace
 
@@ -208,6 +224,7 @@ void IterativeWarpSolver::AddRow(SparseBuilder& builder, const std::int32_t* q, 
 }
 
 void IterativeWarpSolver::AssembleConstantPart() {
+  const Clock::time_point start = Clock::now();
   constantBuilder_.Clear();
   std::fill(constantRhs_.begin(), constantRhs_.end(), 0.0);
   const std::int32_t n = gridSize_, c = n / 2;
@@ -250,6 +267,7 @@ void IterativeWarpSolver::AssembleConstantPart() {
     if (constantBuilder_.RowEntryCount(r) == 0) constantBuilder_.Set(r, r, 1.0);
   }
   constantMatrix_ = std::make_unique<CompressedMatrix>(constantBuilder_);
+  profile_.constantSeconds += SecondsSince(start);
 }
 
 void IterativeWarpSolver::Reset() { AssembleConstantPart(); }
@@ -267,11 +285,20 @@ void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
 }
 
 void IterativeWarpSolver::Solve() {
+  Clock::time_point start = Clock::now();
   if (settings_.useGaussNewton) PrepareGaussNewton();
+  profile_.prepareSeconds += SecondsSince(start);
   succeeded_ = true;
   iterationsRun_ = 0;
   std::vector<double> rhs(unknownCount_), step(unknownCount_);
+  // On the Gauss-Newton road the system keeps its pattern from one
+  // iteration to the next, so it is ordered and analysed once; the other
+  // road's two forms of line rows differ in pattern, and each change is
+  // analysed anew.
+  SparseSession sparse(settings_.useGaussNewton && settings_.usePardiso ? SparseRoad::kPardiso
+                                                                        : SparseRoad::kDss);
   for (std::int32_t iteration = 0; iteration < settings_.iterationCount; ++iteration) {
+    start = Clock::now();
     iterationBuilder_.Clear();
     std::fill(iterationRhs_.begin(), iterationRhs_.end(), 0.0);
     AddIterationTerms(iteration);
@@ -284,30 +311,34 @@ void IterativeWarpSolver::Solve() {
     }
     const CompressedMatrix system =
         CompressedMatrix::Sum(*constantMatrix_, CompressedMatrix(iterationBuilder_));
+    SparseSolveStats stats;
     bool solved;
     if (!settings_.useGaussNewton) {
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r];
       }
-      solved = SolveWithDss(system, rhs, step, order_);
+      solved = sparse.Solve(system, rhs, step, order_, &stats);
       if (solved) solution_ = step;
     } else {
       constantMatrix_->MultiplySymmetric(solution_, rhs);
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r] - rhs[r];
       }
-      solved = settings_.usePardiso ? SolveWithPardiso(system, rhs, step, order_)
-                                    : SolveWithDss(system, rhs, step, order_);
+      solved = sparse.Solve(system, rhs, step, order_, &stats);
       if (solved) {
         for (std::int32_t r = 0; r < unknownCount_; ++r) solution_[r] += step[r];
       }
     }
+    AddStats(profile_, stats);
     if (!solved) {
       succeeded_ = false;
       return;
     }
     ++iterationsRun_;
+    ++profile_.iterations;
     const double measure = ConvergenceMeasure();
+    profile_.assemblySeconds +=
+        SecondsSince(start) - stats.analyseSeconds - stats.factorSeconds - stats.solveSeconds;
     if (measure >= 0.0 && measure < kConverged) break;
   }
 }

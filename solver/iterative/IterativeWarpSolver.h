@@ -33,6 +33,21 @@ struct IterativeWarpSettings {
   float lonMax = 0.0f;
 };
 
+// Where the time of the solves went, summed until cleared; for benchmarks
+// and diagnostics. Seconds of wall-clock time.
+struct SolveProfile {
+  double constantSeconds = 0.0;  // assembling the constant part (construction, Reset)
+  double prepareSeconds = 0.0;   // the Gauss-Newton preparation of each Solve
+  double assemblySeconds = 0.0;  // iteration terms, A0 + M, the right side, convergence
+  double analyseSeconds = 0.0;   // ordering and symbolic analysis
+  double factorSeconds = 0.0;    // numeric factorisation
+  double solveSeconds = 0.0;     // triangular solves
+  std::int32_t iterations = 0;   // systems solved
+  std::size_t peakBytes = 0;     // the sparse library's largest peak of one solve
+  double factorNonzeros = 0.0;   // of the last factor
+  double factorFlops = 0.0;      // of the last factorisation
+};
+
 // The warp as the minimum of a quadratic energy over the (u, v) of every
 // grid vertex. The constant part (anchors to a closed-form regulariser, and
 // whatever conformal and smoothness terms a subclass adds) is assembled once;
@@ -76,6 +91,8 @@ class IterativeWarpSolver : public SphereWarp {
   const EliminationOrder& Order() const { return order_; }
   // Solves done by the last Solve(), for the benchmarks and tests.
   std::int32_t IterationsRun() const { return iterationsRun_; }
+  const SolveProfile& Profile() const { return profile_; }
+  void ClearProfile() { profile_ = SolveProfile{}; }
 
  protected:
   // The constant part; subclasses call it once their own fields are set,
@@ -116,6 +133,7 @@ class IterativeWarpSolver : public SphereWarp {
   EliminationOrder order_;
   bool succeeded_ = true;
   std::int32_t iterationsRun_ = 0;
+  SolveProfile profile_;
 
  private:
   bool ComputeVertexInside(std::int32_t i, std::int32_t j, bool& cache) const;

@@ -3,6 +3,7 @@
 #include <cholmod.h>
 
 #include <algorithm>
+#include <chrono>
 #include <cstdint>
 #include <vector>
 
@@ -12,34 +13,9 @@ namespace {
 
 static_assert(sizeof(int) == sizeof(std::int32_t), "the orders are handed over as int");
 
-// What tells the two roads apart: which orderings the library may choose
-// from when it orders by itself. Both factor supernodally; a column-by-column
-// factorisation was 6 times slower on the default grid and 16 times on the
-// next.
-enum class Road { kLibraryChoice, kMinimumDegree };
-
-// One library session: its common block and the factor, both released when
-// the call ends, whatever way it ends.
-class CholmodCall {
- public:
-  CholmodCall() {
-    cholmod_start(&common_);
-    common_.print = 0;  // failures are answered, never printed
-  }
-  ~CholmodCall() {
-    if (factor_ != nullptr) cholmod_free_factor(&factor_, &common_);
-    cholmod_finish(&common_);
-  }
-  CholmodCall(const CholmodCall&) = delete;
-  CholmodCall& operator=(const CholmodCall&) = delete;
-
-  cholmod_common& Common() { return common_; }
-  cholmod_factor*& Factor() { return factor_; }
-
- private:
-  cholmod_common common_{};
-  cholmod_factor* factor_ = nullptr;
-};
+double SecondsSince(std::chrono::steady_clock::time_point start) {
+  return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+}
 
 bool IsPermutation(const std::vector<std::int32_t>& order) {
   std::vector<bool> seen(order.size(), false);
@@ -52,8 +28,60 @@ bool IsPermutation(const std::vector<std::int32_t>& order) {
   return true;
 }
 
-bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rhs,
-           std::span<double> solution, EliminationOrder& order, SparseSolveStats* stats) {
+}  // namespace
+
+// The library's common block for the session's life, and the last factor
+// with the pattern and the given order it was analysed for.
+struct SparseSession::State {
+  SparseRoad road;
+  cholmod_common common{};
+  cholmod_factor* factor = nullptr;
+  // Rows of the upper triangle are the columns of the lower one: the same
+  // arrays read as compressed columns, less one on every index.
+  std::vector<int> columnStart;
+  std::vector<int> rowIndex;
+  std::vector<int> given;  // empty when the library ordered by itself
+
+  explicit State(SparseRoad r) : road(r) { cholmod_start(&common); }
+  ~State() {
+    DropFactor();
+    cholmod_finish(&common);
+  }
+  State(const State&) = delete;
+  State& operator=(const State&) = delete;
+
+  void DropFactor() {
+    if (factor != nullptr) cholmod_free_factor(&factor, &common);
+  }
+
+  // What tells the two roads apart: which orderings the library may choose
+  // from when it orders by itself. Both factor supernodally; a column-by-
+  // column factorisation was 6 times slower on the default grid and 16
+  // times on the next.
+  void Configure(bool givenOrder) {
+    cholmod_defaults(&common);
+    common.print = 0;  // failures are answered, never printed
+    common.supernodal = CHOLMOD_SUPERNODAL;
+    if (givenOrder) {
+      // Only the given order, not the best of it and the library's own.
+      common.nmethods = 1;
+      common.method[0].ordering = CHOLMOD_GIVEN;
+    } else if (road == SparseRoad::kPardiso) {
+      common.nmethods = 1;
+      common.method[0].ordering = CHOLMOD_AMD;
+    }
+  }
+};
+
+SparseSession::SparseSession(SparseRoad road) : state_(std::make_unique<State>(road)) {}
+
+SparseSession::~SparseSession() = default;
+
+bool SparseSession::Solve(const CompressedMatrix& matrix, std::span<const double> rhs,
+                          std::span<double> solution, EliminationOrder& order,
+                          SparseSolveStats* stats) {
+  reused_ = false;
+  State& state = *state_;
   const std::int32_t n = matrix.Rows();
   const auto size = static_cast<std::size_t>(n);
   if (matrix.Columns() != n || !matrix.IsComplete() || rhs.size() != size ||
@@ -65,8 +93,6 @@ bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rh
     return false;
   }
 
-  // Rows of the upper triangle are the columns of the lower one: the same
-  // arrays read as compressed columns, less one on every index.
   const std::int32_t entries = matrix.FilledEntries();
   std::vector<int> columnStart(size + 1);
   std::vector<int> rowIndex(static_cast<std::size_t>(entries));
@@ -74,13 +100,30 @@ bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rh
                  [](std::int32_t k) { return k - 1; });
   std::transform(matrix.Column(), matrix.Column() + entries, rowIndex.begin(),
                  [](std::int32_t c) { return c - 1; });
+  std::vector<int> given;
+  if (reuseOrder) {
+    given.resize(size);
+    std::transform(order.permutation.begin(), order.permutation.end(), given.begin(),
+                   [](std::int32_t k) { return k - 1; });
+  }
+  // The analysis in hand is the one a fresh start would make when the
+  // pattern is the same and the order is given alike: the library's own
+  // orderings depend on the pattern alone.
+  reused_ = state.factor != nullptr && columnStart == state.columnStart &&
+            rowIndex == state.rowIndex && given == state.given;
+  if (!reused_) {
+    state.DropFactor();
+    state.columnStart = std::move(columnStart);
+    state.rowIndex = std::move(rowIndex);
+    state.given = std::move(given);
+  }
 
   cholmod_sparse a{};
   a.nrow = size;
   a.ncol = size;
   a.nzmax = static_cast<std::size_t>(entries);
-  a.p = columnStart.data();
-  a.i = rowIndex.data();
+  a.p = state.columnStart.data();
+  a.i = state.rowIndex.data();
   // The library only reads the values and the right side.
   a.x = const_cast<double*>(matrix.Value());
   a.stype = -1;
@@ -99,26 +142,15 @@ bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rh
   b.xtype = CHOLMOD_REAL;
   b.dtype = CHOLMOD_DOUBLE;
 
-  CholmodCall call;
-  cholmod_common& common = call.Common();
-  common.supernodal = CHOLMOD_SUPERNODAL;
-  if (road == Road::kMinimumDegree) {
-    common.nmethods = 1;
-    common.method[0].ordering = CHOLMOD_AMD;
+  cholmod_common& common = state.common;
+  auto stageStart = std::chrono::steady_clock::now();
+  if (!reused_) {
+    state.Configure(reuseOrder);
+    state.factor = reuseOrder ? cholmod_analyze_p(&a, state.given.data(), nullptr, 0, &common)
+                              : cholmod_analyze(&a, &common);
   }
-
-  cholmod_factor*& factor = call.Factor();
-  if (reuseOrder) {
-    // Only the given order, not the best of it and the library's own.
-    common.nmethods = 1;
-    common.method[0].ordering = CHOLMOD_GIVEN;
-    std::vector<int> given(size);
-    std::transform(order.permutation.begin(), order.permutation.end(), given.begin(),
-                   [](std::int32_t k) { return k - 1; });
-    factor = cholmod_analyze_p(&a, given.data(), nullptr, 0, &common);
-  } else {
-    factor = cholmod_analyze(&a, &common);
-  }
+  if (stats != nullptr) stats->analyseSeconds = SecondsSince(stageStart);
+  cholmod_factor* factor = state.factor;
   if (factor == nullptr) return false;
 
   if (order.cachePermutation && !order.hasPermutation) {
@@ -128,19 +160,27 @@ bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rh
     order.hasPermutation = true;
   }
 
+  stageStart = std::chrono::steady_clock::now();
   const bool factored = cholmod_factorize(&a, factor, &common) != 0 &&
                         common.status == CHOLMOD_OK && factor->minor == factor->n;
   if (stats != nullptr) {
     stats->factorNonzeros = common.lnz;
     stats->factorFlops = common.fl;
+    stats->factorSeconds = SecondsSince(stageStart);
   }
   if (!factored) {
     if (stats != nullptr) stats->peakBytes = common.memory_usage;
+    // A factor left half done is no start for the next one.
+    state.DropFactor();
     return false;
   }
 
+  stageStart = std::chrono::steady_clock::now();
   cholmod_dense* x = cholmod_solve(CHOLMOD_A, factor, &b, &common);
-  if (stats != nullptr) stats->peakBytes = common.memory_usage;
+  if (stats != nullptr) {
+    stats->peakBytes = common.memory_usage;
+    stats->solveSeconds = SecondsSince(stageStart);
+  }
   if (x == nullptr) return false;
   const double* values = static_cast<const double*>(x->x);
   std::copy(values, values + n, solution.begin());
@@ -148,17 +188,17 @@ bool Solve(Road road, const CompressedMatrix& matrix, std::span<const double> rh
   return common.status == CHOLMOD_OK;
 }
 
-}  // namespace
-
 bool SolveWithDss(const CompressedMatrix& matrix, std::span<const double> rhs,
                   std::span<double> solution, EliminationOrder& order, SparseSolveStats* stats) {
-  return Solve(Road::kLibraryChoice, matrix, rhs, solution, order, stats);
+  SparseSession session(SparseRoad::kDss);
+  return session.Solve(matrix, rhs, solution, order, stats);
 }
 
 bool SolveWithPardiso(const CompressedMatrix& matrix, std::span<const double> rhs,
                       std::span<double> solution, EliminationOrder& order,
                       SparseSolveStats* stats) {
-  return Solve(Road::kMinimumDegree, matrix, rhs, solution, order, stats);
+  SparseSession session(SparseRoad::kPardiso);
+  return session.Solve(matrix, rhs, solution, order, stats);
 }
 
 }  // namespace Project

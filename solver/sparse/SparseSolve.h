@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstddef>
+#include <memory>
 #include <span>
 
 #include "solver/sparse/CompressedMatrix.h"
@@ -13,6 +14,11 @@ struct SparseSolveStats {
   std::size_t peakBytes = 0;    // the factorisation library's peak allocation
   double factorNonzeros = 0.0;  // entries of the Cholesky factor L
   double factorFlops = 0.0;     // floating-point operations of the factorisation
+  // Wall-clock seconds of the three stages: ordering and symbolic analysis,
+  // numeric factorisation, and the triangular solves.
+  double analyseSeconds = 0.0;
+  double factorSeconds = 0.0;
+  double solveSeconds = 0.0;
 };
 
 // Solves A x = rhs for a symmetric positive-definite A given by its upper
@@ -37,5 +43,35 @@ bool SolveWithDss(const CompressedMatrix& matrix, std::span<const double> rhs,
 bool SolveWithPardiso(const CompressedMatrix& matrix, std::span<const double> rhs,
                       std::span<double> solution, EliminationOrder& order,
                       SparseSolveStats* stats = nullptr);
+
+// The two roads, for a session.
+enum class SparseRoad { kDss, kPardiso };
+
+// A run of solves on one road that keeps the ordering and symbolic analysis
+// of the last factorisation while the matrices keep its pattern and its
+// order: each solve then only refactors. The answers are those of the free
+// functions above, which start afresh every time: the order they would
+// compute again is the one already in hand. A pattern or an order that
+// differs from the last one, or a failed factorisation, analyses anew.
+// Owns the library's state; released with the session.
+class SparseSession {
+ public:
+  explicit SparseSession(SparseRoad road);
+  ~SparseSession();
+  SparseSession(const SparseSession&) = delete;
+  SparseSession& operator=(const SparseSession&) = delete;
+
+  // As SolveWithDss or SolveWithPardiso, by the session's road.
+  bool Solve(const CompressedMatrix& matrix, std::span<const double> rhs,
+             std::span<double> solution, EliminationOrder& order,
+             SparseSolveStats* stats = nullptr);
+  // Whether the last Solve reused the analysis of the one before.
+  bool Reused() const { return reused_; }
+
+ private:
+  struct State;
+  std::unique_ptr<State> state_;
+  bool reused_ = false;
+};
 
 }  // namespace Project

@@ -284,5 +284,35 @@ TEST(EliminationOrder, RelabellingKeepsTheVertexOrderAndNumbersTheRest) {
   ExpectSolves(x, grown);
 }
 
+// A session refactors a matrix of the pattern it last analysed and analyses
+// anew for another pattern or after a failed factorisation; every answer is
+// the dense one.
+TEST(SparseSession, KeepsItsAnalysisWhileThePatternHolds) {
+  for (const SparseRoad road : {SparseRoad::kDss, SparseRoad::kPardiso}) {
+    SparseSession session(road);
+    EliminationOrder order;
+    TestSystem s = LeastSquaresSystem(60, 21);
+    std::vector<double> x(s.n);
+    ASSERT_TRUE(session.Solve(CompressedMatrix(s.builder), s.rhs, x, order));
+    EXPECT_FALSE(session.Reused());
+    ExpectSolves(x, s);
+    for (int i = 0; i < s.n; ++i) s.Add(i, i, 0.5 * (i % 3));  // new values, same entries
+    ASSERT_TRUE(session.Solve(CompressedMatrix(s.builder), s.rhs, x, order));
+    EXPECT_TRUE(session.Reused());
+    ExpectSolves(x, s);
+
+    TestSystem other = LeastSquaresSystem(60, 22);
+    ASSERT_TRUE(session.Solve(CompressedMatrix(other.builder), other.rhs, x, order));
+    EXPECT_FALSE(session.Reused());
+    ExpectSolves(x, other);
+    other.Add(0, 0, -100.0);  // indefinite
+    EXPECT_FALSE(session.Solve(CompressedMatrix(other.builder), other.rhs, x, order));
+    const TestSystem again = LeastSquaresSystem(60, 22);
+    ASSERT_TRUE(session.Solve(CompressedMatrix(again.builder), again.rhs, x, order));
+    EXPECT_FALSE(session.Reused());
+    ExpectSolves(x, again);
+  }
+}
+
 }  // namespace
 }  // namespace Project

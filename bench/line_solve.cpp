@@ -1,0 +1,342 @@
+// The whole line solve on a generated photograph (the room through a
+// fisheye, 1200 x 800, default settings): one Solve of the solver hub after
+// lines were added to the plainly solved mesh, as after an edit. Each
+// benchmark runs a variant and a baseline side by side in every iteration
+// and reports the ratio of their median times ("vs_..."), so that the noise
+// of a shared machine falls on both.
+//
+// Counters, per timed solve (medians over the iterations): total and per
+// iteration milliseconds; where the time went (constant part, Gauss-Newton
+// preparation, iteration assembly, ordering, factorisation, triangular
+// solves, and the rest: rotation, mesh collection, the constraints' shown
+// forms); the peak resident memory the solve added (the kernel's high-water
+// mark, reset before it) and the sparse library's own peak. BM_Quality
+// solves more scenes once each and reports how straight the lines end and
+// how conformal the rest stays.
+#include <benchmark/benchmark.h>
+
+#include <malloc.h>
+#include <algorithm>
+#include <chrono>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "tests/solver/quality/QualityScene.h"
+
+namespace {
+
+using namespace Project;
+using namespace Project::quality;
+
+CameraCase TimingCase() {
+  return {"room-fisheye", Synth::SceneKind::kRoom, LensKind::kFisheye, 400.0, 1200, 800, 0.0, 0.0};
+}
+
+struct Variant {
+  std::size_t lines = 10;
+  std::int32_t level = 6;
+  bool gaussNewton = true;
+  bool cacheOrder = false;
+  // Time the edit that adds the last line to the others, solved already,
+  // rather than the solve of all of them on the plain mesh.
+  bool edit = false;
+};
+
+// A line of /proc/self/status in kilobytes, 0 when absent.
+double StatusKb(const char* key) {
+  std::ifstream status("/proc/self/status");
+  std::string line;
+  while (std::getline(status, line)) {
+    if (line.rfind(key, 0) == 0) return std::atof(line.c_str() + std::strlen(key));
+  }
+  return 0.0;
+}
+
+// Lowers the high-water mark of the resident set to the present size.
+void ResetPeak() {
+  std::ofstream clear("/proc/self/clear_refs");
+  clear << "5";
+}
+
+struct Timing {
+  double seconds = 0.0;
+  std::int32_t iterations = 0;
+  SolveProfile profile;
+  double peakMiB = 0.0;
+};
+
+// A scene of one variant: its lines, and a timed solve after putting them
+// back on the plainly solved mesh, or after adding the last of them.
+class Bench {
+ public:
+  explicit Bench(const Variant& variant)
+      : scene_(TimingCase(),
+               [&](PSettings& s) {
+                 s.meshResolution = variant.level;
+                 s.gaussNewtonSolver = variant.gaussNewton ? 1 : 0;
+                 s.cacheDssPermutation = variant.cacheOrder ? 1 : 0;
+               }),
+        edit_(variant.edit) {
+    lines_ = scene_.Pick(variant.lines, true);
+    if (edit_) {
+      // The line added is a free one: it leaves the verticals, and so the
+      // grid's rotation, as they were.
+      const auto free = std::find_if(lines_.rbegin(), lines_.rend(), [](const PickedLine& line) {
+        return line.orientation == LineConstraint::kUnfixed;
+      });
+      if (free != lines_.rend()) std::swap(*free, lines_.back());
+    }
+  }
+
+  Timing Run() {
+    if (edit_ && !lines_.empty()) {
+      if (!solvedBefore_) {
+        std::vector<PickedLine> before(lines_.begin(), lines_.end() - 1);
+        scene_.AddLines(before);
+        solvedBefore_ = true;
+      } else if (const Constraint* last = scene_.list.Find(lines_.back().constraintId)) {
+        scene_.list.Remove(*last);
+      }
+      scene_.solver().Solve(true, false);
+      std::vector<PickedLine> added(lines_.end() - 1, lines_.end());
+      scene_.AddLines(added);
+      lines_.back() = added.front();
+    } else {
+      scene_.RemoveAll();
+      scene_.solver().Solve(true, false);
+      scene_.AddLines(lines_);
+    }
+    auto* warp = dynamic_cast<IterativeWarpSolver*>(scene_.solver().GetWarp().get());
+    warp->ClearProfile();
+    malloc_trim(0);
+    ResetPeak();
+    const double before = StatusKb("VmRSS:");
+    const auto start = std::chrono::steady_clock::now();
+    scene_.solver().Solve(true, false);
+    Timing timing;
+    timing.seconds =
+        std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+    timing.peakMiB = (StatusKb("VmHWM:") - before) / 1024.0;
+    timing.profile = warp->Profile();
+    timing.iterations = warp->IterationsRun();
+    return timing;
+  }
+
+  std::size_t LineCount() const { return lines_.size(); }
+  bool Failed() const { return scene_.context.failures != 0; }
+
+ private:
+  QualityScene scene_;
+  std::vector<PickedLine> lines_;
+  bool edit_;
+  bool solvedBefore_ = false;
+};
+
+double Median(std::vector<double> values) {
+  if (values.empty()) return 0.0;
+  std::sort(values.begin(), values.end());
+  return values[values.size() / 2];
+}
+
+// Runs the variant and the baseline alternately, times the variant, and
+// reports medians and their ratio under the name `ratio`.
+void RunPair(benchmark::State& state, const Variant& variant, const Variant& baseline,
+             const char* ratio) {
+  Bench bench(variant);
+  Bench base(baseline);
+  std::vector<double> total, perIteration, constant, prepare, assembly, analyse, factor, solve,
+      rest, peak, library, baseTotal, iterations;
+  double factorNonzeros = 0.0, factorFlops = 0.0;
+  for (auto _ : state) {
+    const Timing t = bench.Run();
+    const Timing b = base.Run();
+    state.SetIterationTime(t.seconds);
+    const SolveProfile& p = t.profile;
+    total.push_back(t.seconds * 1e3);
+    perIteration.push_back(t.iterations > 0 ? t.seconds * 1e3 / t.iterations : 0.0);
+    iterations.push_back(t.iterations);
+    constant.push_back(p.constantSeconds * 1e3);
+    prepare.push_back(p.prepareSeconds * 1e3);
+    assembly.push_back(p.assemblySeconds * 1e3);
+    analyse.push_back(p.analyseSeconds * 1e3);
+    factor.push_back(p.factorSeconds * 1e3);
+    solve.push_back(p.solveSeconds * 1e3);
+    rest.push_back((t.seconds - p.constantSeconds - p.prepareSeconds - p.assemblySeconds -
+                    p.analyseSeconds - p.factorSeconds - p.solveSeconds) *
+                   1e3);
+    peak.push_back(t.peakMiB);
+    library.push_back(static_cast<double>(p.peakBytes) / (1 << 20));
+    factorNonzeros = p.factorNonzeros;
+    factorFlops = p.factorFlops;
+    baseTotal.push_back(b.seconds * 1e3);
+  }
+  if (bench.Failed() || base.Failed()) state.SkipWithError("a solve failed");
+  state.counters["lines"] = static_cast<double>(bench.LineCount());
+  state.counters["iterations"] = Median(iterations);
+  state.counters["total_ms"] = Median(total);
+  state.counters["per_iteration_ms"] = Median(perIteration);
+  state.counters["constant_ms"] = Median(constant);
+  state.counters["prepare_ms"] = Median(prepare);
+  state.counters["assembly_ms"] = Median(assembly);
+  state.counters["analyse_ms"] = Median(analyse);
+  state.counters["factor_ms"] = Median(factor);
+  state.counters["solve_ms"] = Median(solve);
+  state.counters["rest_ms"] = Median(rest);
+  state.counters["peak_MiB"] = Median(peak);
+  state.counters["cholmod_MiB"] = Median(library);
+  state.counters["factor_nnz"] = factorNonzeros;
+  state.counters["factor_Mflop"] = factorFlops / 1e6;
+  state.counters["baseline_ms"] = Median(baseTotal);
+  state.counters[ratio] = Median(total) / Median(baseTotal);
+}
+
+// 0, 10 and 40 lines beside the plain solve of no lines.
+void BM_Lines(benchmark::State& state) {
+  Variant variant;
+  variant.lines = static_cast<std::size_t>(state.range(0));
+  Variant baseline;
+  baseline.lines = 0;
+  RunPair(state, variant, baseline, "vs_no_lines");
+}
+BENCHMARK(BM_Lines)
+    ->ArgName("lines")
+    ->Arg(0)
+    ->Arg(10)
+    ->Arg(40)
+    ->Iterations(7)
+    ->UseManualTime()
+    ->Unit(benchmark::kMillisecond);
+
+// One more line added to nine solved ones (the interactive edit) beside the
+// solve of all ten on the plain mesh.
+void BM_AddOneLine(benchmark::State& state) {
+  Variant variant;
+  variant.edit = true;
+  RunPair(state, variant, Variant{}, "vs_all_lines");
+}
+BENCHMARK(BM_AddOneLine)->Iterations(7)->UseManualTime()->Unit(benchmark::kMillisecond);
+
+// The alternating road beside Gauss-Newton, 10 lines.
+void BM_AlternatingRoad(benchmark::State& state) {
+  Variant variant;
+  variant.gaussNewton = false;
+  RunPair(state, variant, Variant{}, "vs_gauss_newton");
+}
+BENCHMARK(BM_AlternatingRoad)->Iterations(7)->UseManualTime()->Unit(benchmark::kMillisecond);
+
+// A cached elimination order beside a fresh one each solve, 10 lines.
+void BM_CachedOrder(benchmark::State& state) {
+  Variant variant;
+  variant.cacheOrder = true;
+  RunPair(state, variant, Variant{}, "vs_fresh_order");
+}
+BENCHMARK(BM_CachedOrder)->Iterations(7)->UseManualTime()->Unit(benchmark::kMillisecond);
+
+// Mesh levels 5 to 8 beside the default level 6, 10 lines.
+void BM_MeshLevel(benchmark::State& state) {
+  Variant variant;
+  variant.level = static_cast<std::int32_t>(state.range(0));
+  RunPair(state, variant, Variant{}, "vs_level_6");
+}
+BENCHMARK(BM_MeshLevel)
+    ->ArgName("level")
+    ->Arg(5)
+    ->Arg(6)
+    ->Arg(7)
+    ->Iterations(3)
+    ->UseManualTime()
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_MeshLevel)
+    ->ArgName("level")
+    ->Arg(8)
+    ->Iterations(1)
+    ->UseManualTime()
+    ->Unit(benchmark::kMillisecond);
+
+// More scenes, each solved once with ten lines (and a polygon where the
+// scene has a plane in view): the worst line's deviations in output pixels,
+// whole and without its end cells, the worst pinned direction in degrees,
+// the polygon's homography residual at its vertices and through the mesh,
+// and the singular value ratio of the cells that hold no constraint sample
+// (median and 95th percentile) beside the plain solve's.
+void BM_Quality(benchmark::State& state, const CameraCase& camera, const ScenePlane* plane) {
+  SceneReport r;
+  for (auto _ : state) {
+    QualityScene scene(camera);
+    r = RunScene(scene, 10, true, plane);
+  }
+  state.counters["lines"] = static_cast<double>(r.traced);
+  state.counters["pinned"] = static_cast<double>(r.pinned);
+  state.counters["iterations"] = r.iterations;
+  state.counters["max_px"] = r.samplesMax;
+  state.counters["rms_px"] = r.samplesRms;
+  state.counters["truth_max_px"] = r.truthMax;
+  state.counters["truth_rms_px"] = r.truthRms;
+  state.counters["inner_max_px"] = r.innerSamplesMax;
+  state.counters["inner_rms_px"] = r.innerSamplesRms;
+  state.counters["inner_truth_max_px"] = r.innerTruthMax;
+  state.counters["inner_truth_rms_px"] = r.innerTruthRms;
+  state.counters["direction_deg"] = r.directionError;
+  state.counters["inner_direction_deg"] = r.innerDirectionError;
+  if (r.polygon) {
+    state.counters["polygon_vertex_px"] = r.polygonVertexError;
+    state.counters["polygon_mesh_px"] = r.polygonError;
+  }
+  state.counters["conformal_median"] = r.constrained.median;
+  state.counters["conformal_p95"] = r.constrained.p95;
+  state.counters["plain_median"] = r.plain.median;
+  state.counters["plain_p95"] = r.plain.p95;
+  if (!r.succeeded || r.traced != r.picked) state.SkipWithError("a line or the solve failed");
+}
+
+const ScenePlane kRoomWall = RoomFarWall();
+const ScenePlane kFacadeWall = FacadeWall();
+const ScenePlane kBoard = CheckerBoard();
+using Synth::SceneKind;
+BENCHMARK_CAPTURE(BM_Quality, room_fisheye,
+                  CameraCase{"", SceneKind::kRoom, LensKind::kFisheye, 400.0, 1200, 800},
+                  &kRoomWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, room_fisheye_pitched_15,
+                  CameraCase{"", SceneKind::kRoom, LensKind::kFisheye, 400.0, 1200, 800, 0.0, 15.0},
+                  &kRoomWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, room_fisheye_profile,
+                  CameraCase{"", SceneKind::kRoom, LensKind::kFisheyePoly, 400.0, 1200, 800},
+                  &kRoomWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, checker_fisheye,
+                  CameraCase{"", SceneKind::kChecker, LensKind::kFisheye, 400.0, 1200, 800},
+                  &kBoard)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, room_distorted,
+                  CameraCase{"", SceneKind::kRoom, LensKind::kDistorted, 600.0, 1200, 800},
+                  &kRoomWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, facade_distorted_yaw_15_pitch_10,
+                  CameraCase{"", SceneKind::kFacade, LensKind::kDistorted, 700.0, 1200, 800, 15.0,
+                             10.0},
+                  &kFacadeWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, room_cylindrical,
+                  CameraCase{"", SceneKind::kRoom, LensKind::kCylindrical, 400.0, 1600, 600},
+                  &kRoomWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Quality, facade_cylindrical,
+                  CameraCase{"", SceneKind::kFacade, LensKind::kCylindrical, 500.0, 1600, 700,
+                             15.0},
+                  &kFacadeWall)
+    ->Iterations(1)
+    ->Unit(benchmark::kMillisecond);
+
+}  // namespace
