@@ -106,8 +106,8 @@ std::string PFilter::PreferencesDirectory() const {
 
 PImageHub& PFilter::ImageHub() {
   if (imageHub_ == nullptr) {
-    imageHub_ =
-        std::make_unique<PImageHub>(ImageRect(), LayerRect(), Depth(), PreferencesDirectory());
+    imageHub_ = std::make_unique<PImageHub>(*this, ImageRect(), LayerRect(), Depth(),
+                                            PreferencesDirectory(), ShaderFile());
   }
   return *imageHub_;
 }

@@ -106,6 +106,8 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, priva
   virtual FocalData MetadataFocalData() const;
   // True when a lens profile of the photo was found and put in the settings.
   virtual bool MatchLensProfile(bool warn);
+  // The fragment shader's file; empty: the one beside the host executable.
+  virtual std::string ShaderFile() const { return {}; }
 
  private:
   void OpenMetadata();
@@ -136,8 +138,11 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, priva
     return ChooseSphereModel(image, model);
   }
   void ReportSolve(bool failed) override { solveFailed_ = failed ? 1 : 0; }
-  // The result panes come with the rendering; nothing shows a mesh yet.
-  void RebuildResults() override {}
+  // A new mesh makes every rendered result stale; until panes exist there is
+  // nothing to redraw.
+  void RebuildResults() override {
+    if (imageHub_ != nullptr) imageHub_->RebuildResults();
+  }
   void RedrawResults() override {}
 
   std::unique_ptr<PImageHub> imageHub_;

@@ -9,15 +9,17 @@
 
 namespace Project {
 
+class PFilter;
 class POpenGLManager;
+class PResult;
+class PSource;
 
 // The owner of every image stage of a run and of the OpenGL manager, and the
 // idler that advances the stages between events. Made by the filter's first
 // ImageHub(), which is the run's check of the OpenGL environment: the
 // constructor picks the texture formats by depth, builds the manager and
-// says in GLStatus() whether the run can go on. The stages, their idle work
-// and the rendering are added on top of this; until then Idle() has nothing
-// to do.
+// says in GLStatus() whether the run can go on. Stages are made on first
+// demand; nothing is read from the host before a stage asks for it.
 class PImageHub : public Tarsa::CIdler {
  public:
   // GLStatus values.
@@ -31,11 +33,12 @@ class PImageHub : public Tarsa::CIdler {
   static constexpr std::uint32_t kGLUnsignedByte = 5121;
   static constexpr std::uint32_t kGLUnsignedShort = 5123;
 
-  // imageRect and sourceRect: the filter's ImageRect() and LayerRect();
-  // depth: the image's bits per sample; logDirectory: where the shader log
-  // goes (empty: none).
-  PImageHub(const Tarsa::CRect& imageRect, const Tarsa::CRect& sourceRect, std::uint32_t depth,
-            std::string logDirectory);
+  // filter: the run's filter, which outlives the hub. The rectangles and the
+  // depth are the filter's ImageRect(), LayerRect() and Depth().
+  // logDirectory: where the shader log goes (empty: none); shaderFile: the
+  // fragment shader (empty: beside the host executable).
+  PImageHub(PFilter& filter, const Tarsa::CRect& imageRect, const Tarsa::CRect& sourceRect,
+            std::uint32_t depth, std::string logDirectory, std::string shaderFile = {});
   ~PImageHub() override;
   PImageHub(const PImageHub&) = delete;
   PImageHub& operator=(const PImageHub&) = delete;
@@ -50,14 +53,30 @@ class PImageHub : public Tarsa::CIdler {
   std::uint32_t PixelType() const { return pixelType_; }
   POpenGLManager& GLManager() { return *glManager_; }
 
-  bool Idle() override { return false; }
+  // The stages, made with their rectangles on first demand.
+  PSource& Source();
+  PResult& ResultFull();
+  bool HasResultFull() const { return resultFull_ != nullptr; }
 
-  // The scripted run's final image into the host; true when it went back.
-  // The final rendering is not part of this build: it throws a CError that
-  // says so.
+  // The solver's geometry changed: every result is stale.
+  void RebuildResults();
+  // The source changed over area: the stages built on it are stale there.
+  void SourceChanged(const Tarsa::CRect& area);
+
+  // Idle work runs only while no one holds the hub suspended.
+  void Suspend();
+  void Resume();
+  bool Suspended() const { return suspendCount_ != 0; }
+
+  // Reads ahead the source, a tile per call, while nothing else is due.
+  bool Idle() override;
+
+  // The final image into the host, with the host's progress and abort
+  // callbacks; true when every tile went back, false on the host's abort.
   bool RenderFinalSilent();
 
  private:
+  PFilter& filter_;
   Tarsa::CRect imageRect_;
   Tarsa::CRect sourceRect_;
   std::uint32_t textureFormat_;
@@ -67,6 +86,9 @@ class PImageHub : public Tarsa::CIdler {
   std::int32_t glStatus_ = kGLMissing;
   bool glUsable_ = false;
   bool npotTextures_ = false;
+  std::uint32_t suspendCount_ = 0;
+  std::unique_ptr<PSource> sourceFull_;
+  std::unique_ptr<PResult> resultFull_;
 };
 
 }  // namespace Project

@@ -1,7 +1,15 @@
 #!/usr/bin/env bash
-# From a fresh machine: set-up, build, and the main job on the bundled sample.
+# From a fresh machine: set-up, build, and the main job on the sample: a
+# generated fisheye photograph of a room and the action that straightens its
+# edges, replayed by the host program.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/setup.sh
 scripts/build.sh release
-build/release/host/archway --help
+out=build/sample
+mkdir -p "$out"
+build/release/tools/synth/archway-synth --scene room --projection fisheye-equisolid \
+  --focal-mm 10 --size 1800x1200 -o "$out/room.tif" --action "$out/room.action"
+build/release/host/archway apply --action "$out/room.action" -o "$out/room-archway.tif" \
+  "$out/room.tif"
+echo "sample: $out/room.tif corrected into $out/room-archway.tif"

@@ -1,0 +1,57 @@
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+namespace Project {
+
+class POpenGLManager;
+
+// One pass of a result tile on the manager's 128 x 128 target, described
+// without OpenGL types so that the stages above need no GL headers: the view,
+// the texture of the source pixels the tile needs, the mesh part that covers
+// the tile, and where the target's pixels go. The context must be current.
+struct POpenGLTilePass {
+  // Orthographic view: x from left to right across the target; y at bottom
+  // lies on the target's first row (the first row read back).
+  double left = 0;
+  double right = 1;
+  double bottom = 0;
+  double top = 1;
+  // Model-view: vertices are shifted, then scaled uniformly.
+  float zoom = 1;
+  float shiftX = 0;
+  float shiftY = 0;
+
+  // false: the pass only clears the target.
+  bool drawGeometry = false;
+  // false: cells are drawn as red outlines, untextured.
+  bool textured = true;
+
+  // Four samples per texel, rows from t = 0, of pixelType.
+  const void* texels = nullptr;
+  int textureWidth = 0;
+  int textureHeight = 0;
+  std::uint32_t textureFormat = 0;
+  std::uint32_t pixelFormat = 0;
+  std::uint32_t pixelType = 0;
+
+  // Two floats per vertex each.
+  const float* vertices = nullptr;
+  const float* texCoords = nullptr;
+  // Vertex indices, three per triangle and four per quad.
+  const std::uint32_t* triangles = nullptr;
+  std::size_t triangleIndices = 0;
+  const std::uint32_t* quads = nullptr;
+  std::size_t quadIndices = 0;
+
+  // 128 x 128 x 4 samples of pixelType: the target after the pass.
+  void* readback = nullptr;
+};
+
+// Clears, draws and reads back one pass. With the manager's shader the
+// texture is sampled texel by texel and the shader interpolates; without it,
+// bilinear filtering does.
+void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass);
+
+}  // namespace Project

@@ -1,0 +1,241 @@
+// The final rendering of a scripted run, through the real host library: the
+// tiled GPU result against a CPU rendering of the same mesh, in every image
+// mode, and the host's progress and abort callbacks.
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <utility>
+#include <vector>
+
+#include "filter/PFilter.h"
+#include "framework/plugin/CPluginEntry.h"
+#include "solver/frame/Solver.h"
+#include "tests/filter/render/ReferenceRender.h"
+#include "tests/filter/spine/SpineFixture.h"
+#include "tests/framework/plugin/RealHost.h"
+
+// Mesa's EGL keeps a one-time allocation of its driver's start-up for the
+// life of the process. The slow unwinder is not asked for here: llvmpipe's
+// shader compiler registers unwind tables under the unwinder's own lock, and
+// a slow unwind of that allocation deadlocks.
+extern "C" const char* __lsan_default_suppressions() { return "leak:libEGL_mesa.so\n"; }
+
+namespace Project::testing {
+namespace {
+
+using Host::ImageMode;
+
+class RenderFilter : public TestPFilter {
+ public:
+  std::string ShaderFile() const override {
+    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
+  }
+};
+
+// The real host, with a cancel at a chosen abort check and the progress kept.
+class CallbackHost : public Tarsa::testing::RealHost {
+ public:
+  using RealHost::RealHost;
+  int abortAtCheck = -1;  // 0: the first check answers yes
+  int abortChecks = 0;
+  std::vector<std::pair<std::int32_t, std::int32_t>> progress;
+
+ private:
+  bool AbortRequested() override { return abortChecks++ == abortAtCheck; }
+  void Progress(std::int32_t done, std::int32_t total) override {
+    progress.emplace_back(done, total);
+  }
+};
+
+// Waves, a different phase in each plane so that planes put in the wrong
+// place show. The fine one, about seven pixels long, tells the bicubic
+// kernel from a bilinear one.
+void FillSmooth(Host::HostDocument& document) {
+  const int max = document.MaxSample();
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (std::int32_t y = 0; y < document.Height(); ++y) {
+      for (std::int32_t x = 0; x < document.Width(); ++x) {
+        const double wave = 0.5 +
+                            0.25 * std::sin(x * 0.21 + p * 1.3) * std::cos(y * 0.17 + p * 0.7) +
+                            0.2 * std::sin(x * 0.9 + y * 0.7 + p);
+        document.SetSample(p, x, y, int(std::lround(wave * max)));
+      }
+    }
+  }
+}
+
+// A sample as the texture holds it, 0..1: 16-bit samples (0..32768) are
+// doubled into the full 16-bit range first.
+double Normalised(int sample, int depth) {
+  if (depth == 8) return sample / 255.0;
+  return (sample < 32768 ? 2.0 * sample : 65535.0) / 65535.0;
+}
+
+// A rendered 0..1 value as the host gets it back.
+int HostSample(double value, int depth) {
+  if (depth == 8) return int(std::lround(value * 255));
+  const long full = std::lround(value * 65535);
+  return full < 65535 ? int(full / 2) : 32768;
+}
+
+struct Tally {
+  int compared = 0;
+  int failed = 0;
+};
+
+class FinalRender : public ::testing::Test {
+ protected:
+  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
+  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
+
+  // A scripted run over host's document; answers the start selector's code
+  // and leaves the filter's solved mesh in filter.
+  std::int16_t RunScripted(CallbackHost& host, RenderFilter& filter) {
+    if (filter.HandlePrepare(host.Record(), nullptr) != 0) return -1;
+    return filter.HandleStart(host.Record(), nullptr);
+  }
+
+  // Compares the host's document after the run with the CPU rendering of
+  // the run's mesh over the document as it was.
+  Tally Compare(const Host::HostDocument& before, const Host::HostDocument& after,
+                const Solver& solver, int tolerance) {
+    const int depth = before.Depth();
+    const int planes = before.ColourPlanes() + 1;
+    const int alpha = before.ColourPlanes();
+    const ReferenceImage reference =
+        RenderReference(solver, before.Width(), before.Height(), planes,
+                        [&](std::int32_t p, std::int32_t x, std::int32_t y) {
+                          // Without transparency the source is opaque.
+                          if (p == alpha && !before.HasTransparency()) return 1.0;
+                          return Normalised(before.Sample(p, x, y), depth);
+                        });
+    // The host takes a transparency plane back only with three or four
+    // colour planes; a gray image keeps its own.
+    const int written = before.ColourPlanes() + (before.HasTransparency() && alpha >= 3 ? 1 : 0);
+    Tally tally;
+    // Source points this close to the picture's edge are left out: the
+    // kernel meets the edge there, which the tiles pad or clamp by position.
+    constexpr double kEdge = 3.0;
+    const double w = before.Width(), h = before.Height();
+    for (std::int32_t y = 0; y < before.Height(); ++y) {
+      for (std::int32_t x = 0; x < before.Width(); ++x) {
+        if (!reference.Covered(x, y)) continue;
+        const double sx = reference.sourceX[reference.Index(x, y)];
+        const double sy = reference.sourceY[reference.Index(x, y)];
+        if (sx < kEdge || sx > w - kEdge || sy < kEdge || sy > h - kEdge) continue;
+        ++tally.compared;
+        for (int p = 0; p < written; ++p) {
+          if (std::abs(after.Sample(p, x, y) - HostSample(reference.Value(p, x, y), depth)) >
+              tolerance) {
+            ++tally.failed;
+            break;
+          }
+        }
+      }
+    }
+    return tally;
+  }
+
+  ScopedConfigHome config;
+};
+
+std::unique_ptr<Host::HostDocument> Copy(const Host::HostDocument& document) {
+  auto copy = Host::HostDocument::Create(document.Width(), document.Height(), document.Mode(),
+                                         document.HasTransparency());
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (std::int32_t y = 0; y < document.Height(); ++y) {
+      for (std::int32_t x = 0; x < document.Width(); ++x)
+        copy->SetSample(p, x, y, document.Sample(p, x, y));
+    }
+  }
+  return copy;
+}
+
+// Tiles of 128 pixels with partial ones at the right and bottom: a wrong
+// tile offset, a seam or a flipped row order shows against the whole CPU
+// rendering.
+TEST_F(FinalRender, TiledResultMatchesTheMeshRenderedWhole) {
+  CallbackHost host(ImageMode::kRgb, 333, 222, true);
+  FillSmooth(*host.document);
+  const auto before = Copy(*host.document);
+  RenderFilter filter;
+  ASSERT_EQ(RunScripted(host, filter), 0);
+  const Tally tally = Compare(*before, *host.document, filter.Constraints().GetSolver(),
+                              // float rounding on the GPU against double here: one step
+                              // either way, and one for the texture coordinates' precision
+                              2);
+  ASSERT_GT(tally.compared, 333 * 222 / 2) << "most of the result shows the picture";
+  // Pixel centres on a cell's edge may fall to the other triangle, which
+  // samples a hair's breadth away: a few pixels per hundred cells.
+  EXPECT_LE(tally.failed, tally.compared / 200) << tally.failed << " of " << tally.compared;
+}
+
+// Every mode at both depths, with and without transparency: the planes are
+// interleaved into the texture and back by mode (gray in R, G and B; CMYK's
+// fifth plane in a second pass), and 16-bit samples go through the texture's
+// full range.
+TEST_F(FinalRender, EveryModeComesBackRight) {
+  const ImageMode modes[] = {ImageMode::kGray,  ImageMode::kRgb,    ImageMode::kCmyk,
+                             ImageMode::kLab,   ImageMode::kGray16, ImageMode::kRgb48,
+                             ImageMode::kLab48, ImageMode::kCmyk64};
+  for (const ImageMode mode : modes) {
+    for (const bool transparency : {false, true}) {
+      SCOPED_TRACE(::testing::Message()
+                   << "mode " << int(mode) << " transparency " << transparency);
+      Tarsa::CPluginEntry::TearDown();
+      CallbackHost host(mode, 150, 100, transparency);
+      FillSmooth(*host.document);
+      const auto before = Copy(*host.document);
+      RenderFilter filter;
+      ASSERT_EQ(RunScripted(host, filter), 0);
+      const int tolerance = Host::DepthOf(mode) == 8
+                                // as in the whole-image comparison
+                                ? 2
+                                // half floats in the texture and the target: 11 bits of
+                                // mantissa, rounded twice, in samples of 0..32768
+                                : 24;
+      const Tally tally =
+          Compare(*before, *host.document, filter.Constraints().GetSolver(), tolerance);
+      ASSERT_GT(tally.compared, 150 * 100 / 2);
+      // Edge pixels of cells, as in the whole-image comparison.
+      EXPECT_LE(tally.failed, tally.compared / 200) << tally.failed << " of " << tally.compared;
+    }
+  }
+}
+
+// The host's callbacks: progress from the first count to the total, and a
+// cancel at the first check that leaves the image as it was.
+TEST_F(FinalRender, ProgressRunsToTheTotalAndCancelWritesNothing) {
+  {
+    CallbackHost host(ImageMode::kRgb, 300, 200, false);
+    RenderFilter filter;
+    ASSERT_EQ(RunScripted(host, filter), 0);
+    ASSERT_GE(host.progress.size(), 2u);
+    const auto total = host.progress.front().second;
+    EXPECT_GT(total, 6) << "six final tiles and the result and source tiles below them";
+    EXPECT_EQ(host.progress.back(), std::make_pair(total, total));
+    for (std::size_t i = 1; i < host.progress.size(); ++i)
+      EXPECT_GE(host.progress[i].first, host.progress[i - 1].first);
+  }
+  {
+    Tarsa::CPluginEntry::TearDown();
+    CallbackHost host(ImageMode::kRgb, 300, 200, false);
+    const auto before = Copy(*host.document);
+    host.abortAtCheck = 0;
+    RenderFilter filter;
+    EXPECT_EQ(RunScripted(host, filter), 1) << "a cancelled run answers 1";
+    EXPECT_EQ(host.advanceCalls, 0) << "nothing went to the host";
+    EXPECT_EQ(host.progress.size(), 1u);
+    int changed = 0;
+    for (int p = 0; p < 3; ++p)
+      for (std::int32_t y = 0; y < 200; ++y)
+        for (std::int32_t x = 0; x < 300; ++x)
+          changed += host.document->Sample(p, x, y) != before->Sample(p, x, y);
+    EXPECT_EQ(changed, 0);
+  }
+}
+
+}  // namespace
+}  // namespace Project::testing
