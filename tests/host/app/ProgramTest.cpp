@@ -13,6 +13,8 @@
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"
 #include "tests/host/io/TestImages.h"
+#include "tools/synth/lib/PhotoWriter.h"
+#include "tools/synth/lib/Render.h"
 
 namespace Host {
 namespace {
@@ -262,6 +264,62 @@ TEST_F(ProgramTest, TheRealModuleIsReachedForEveryKindOfFile) {
               std::string::npos)
         << result.errors;
     EXPECT_EQ(ReadBytes(input), before[i]);
+  }
+}
+// A scripted run resolves the projection model by the module's rules, and
+// the descriptor the host saves shows it: Auto stays Auto when a shipped
+// lens profile matches the photo's camera and lens, or when the photo is a
+// panorama with its own record; with neither it falls back to fisheye. Full
+// Spherical holds on a 2:1 picture and falls back on any other.
+TEST_F(ProgramTest, ScriptedRunsResolveTheProjectionModel) {
+  const std::string module = ARCHWAY_REAL_MODULE;
+  struct Case {
+    const char* name;
+    Synth::ProjectionKind projection;
+    int width, height;
+    const char* make;
+    const char* model;
+    const char* lens;
+    uint32_t asked;     // prjM of the action
+    uint32_t resolved;  // prjM of the saved descriptor
+  };
+  const Case cases[] = {
+      {"profile", Synth::ProjectionKind::kFisheyeEquisolid, 300, 200, "Orvane Test", "TC-1 Full",
+       "Orvane Test 8mm F3.5 Fisheye", FourCC("autP"), FourCC("autP")},
+      {"unknown", Synth::ProjectionKind::kFisheyeEquisolid, 300, 200, "Archway", "Synthetic Camera",
+       "", FourCC("autP"), FourCC("fisP")},
+      {"panorama", Synth::ProjectionKind::kCylindrical, 400, 200, "Archway", "Synthetic Camera", "",
+       FourCC("autP"), FourCC("autP")},
+      {"sphere", Synth::ProjectionKind::kEquirectangular, 400, 200, "Archway", "Synthetic Camera",
+       "", FourCC("fusP"), FourCC("fusP")},
+      {"notsphere", Synth::ProjectionKind::kEquirectangular, 300, 200, "Archway",
+       "Synthetic Camera", "", FourCC("fusP"), FourCC("fisP")},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.name);
+    Synth::CameraSpec camera;
+    camera.projection = c.projection;
+    camera.focalMm = 8.0;
+    camera.width = c.width;
+    camera.height = c.height;
+    camera.samplesPerAxis = 1;
+    camera.make = c.make;
+    camera.model = c.model;
+    camera.lens = c.lens;
+    const std::string photo = folder_.File(std::string(c.name) + ".tif");
+    Synth::PhotoWriter::Write(Synth::Render({Synth::SceneKind::kRoom}, camera), camera, photo);
+    const std::string asked = folder_.File(std::string(c.name) + ".action");
+    Descriptor action;
+    action.PutEnumerated(FourCC("prjM"), FourCC("prjM"), c.asked);
+    ActionFile::Write(action, asked);
+    const std::string saved = folder_.File(std::string(c.name) + "-saved.action");
+    const Result result =
+        RunProgram({"apply", "--module", module, "--action", asked, "--save-action", saved, photo});
+    ASSERT_EQ(result.status, 0) << result.errors;
+    const Descriptor descriptor = ActionFile::Read(saved);
+    const auto* model = descriptor.Find(FourCC("prjM"));
+    ASSERT_NE(model, nullptr);
+    EXPECT_EQ(model->enumValue, c.resolved);
   }
 }
 #endif
