@@ -45,11 +45,15 @@ function(archway_library)
   endforeach()
 endfunction()
 
-# archway_test(NAME <name> DIRS <dir>... LIBS <our libs>... [SYSTEM ...])
+# archway_test(NAME <name> DIRS <dir>... LIBS <our libs>... [SYSTEM ...]
+#              [END_TO_END])
 # One GoogleTest program per test folder, registered with CTest; the
-# sanitizer variant's cases carry the prefix "san.".
+# sanitizer variant's cases carry the prefix "san.". END_TO_END marks a
+# program that drives whole runs (the program, the acceptance scenes): it is
+# built plainly only, since the code it reaches has unit tests under the
+# sanitizers and a second, slower pass would only lengthen the run.
 function(archway_test)
-  cmake_parse_arguments(A "" "NAME" "DIRS;LIBS;SYSTEM" ${ARGN})
+  cmake_parse_arguments(A "END_TO_END" "NAME" "DIRS;LIBS;SYSTEM" ${ARGN})
   set(sources)
   foreach(dir ${A_DIRS})
     file(GLOB_RECURSE found CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/${dir}/*.cpp)
@@ -59,7 +63,7 @@ function(archway_test)
     return()
   endif()
   foreach(variant "" "_san")
-    if(variant STREQUAL "_san" AND NOT ARCHWAY_SANITIZE)
+    if(variant STREQUAL "_san" AND (NOT ARCHWAY_SANITIZE OR A_END_TO_END))
       continue()
     endif()
     set(target ${A_NAME}_tests${variant})
