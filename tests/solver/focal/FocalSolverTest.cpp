@@ -30,14 +30,14 @@ double DistanceToLine(Point2f p, Point2f a, Point2f b) {
 // all from the generator's exact projection. Kept only where the image
 // bends enough for the focal length to show.
 std::vector<Triple> RoomTriples(double focalMm, std::mt19937& random, double* focalPixels) {
-  Synth::CameraSpec spec;
-  spec.projection = Synth::ProjectionKind::kFisheyeEquisolid;
-  spec.focalMm = focalMm;
-  spec.cropFactor = 1.5;
-  spec.width = FocalContext::kWidth;
-  spec.height = FocalContext::kHeight;
+  Synth::CameraSpec shot;
+  shot.projection = Synth::ProjectionKind::kFisheyeEquisolid;
+  shot.focalMm = focalMm;
+  shot.cropFactor = 1.5;
+  shot.width = FocalContext::kWidth;
+  shot.height = FocalContext::kHeight;
   const Synth::Scene scene = Synth::Scene::Make(Synth::SceneKind::kRoom);
-  const Synth::Camera camera = Synth::MakeCamera(scene, spec);
+  const Synth::Camera camera = Synth::MakeCamera(scene, shot);
   *focalPixels = camera.Lens().Focal();
 
   std::uniform_real_distribution<double> place(0.25, 0.75);

@@ -328,7 +328,7 @@ inline ScenePlane CheckerBoard() { return {{2.0, -1.4, -1.0}, {0.0, 2.8, 0.0}, {
 struct QualityScene {
   explicit QualityScene(const CameraCase& c,
                         const std::function<void(PSettings&)>& adjust = nullptr)
-      : spec(c),
+      : shot(c),
         scene(Synth::Scene::Make(c.scene)),
         camera(MakeCamera(scene, c)),
         context(c, camera),
@@ -394,7 +394,7 @@ struct QualityScene {
                             std::size_t& last) { return OnMesh(points, first, last); });
   }
 
-  CameraCase spec;
+  CameraCase shot;
   Synth::Scene scene;
   Synth::Camera camera;
   QualityContext context;
