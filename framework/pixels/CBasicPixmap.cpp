@@ -45,39 +45,12 @@ const std::uint8_t* CBasicPixmap::Address(std::uint32_t plane, std::int32_t x,
 }
 
 std::uint32_t CBasicPixmap::Sample(std::uint32_t plane, std::int32_t x, std::int32_t y) const {
-  const std::uint8_t* at = Address(plane, x, y);
-  switch (Depth()) {
-    case 8:
-      return *at;
-    case 16: {
-      std::uint16_t v;
-      std::memcpy(&v, at, 2);
-      return v;
-    }
-    default: {
-      std::uint32_t v;
-      std::memcpy(&v, at, 4);
-      return v;
-    }
-  }
+  return LoadBytes(Address(plane, x, y), BytesPerSample());
 }
 
 void CBasicPixmap::SetSample(std::uint32_t plane, std::int32_t x, std::int32_t y,
                              std::uint32_t value) {
-  std::uint8_t* at = Address(plane, x, y);
-  switch (Depth()) {
-    case 8:
-      *at = std::uint8_t(value);
-      break;
-    case 16: {
-      const auto v = std::uint16_t(value);
-      std::memcpy(at, &v, 2);
-      break;
-    }
-    default:
-      std::memcpy(at, &value, 4);
-      break;
-  }
+  StoreBytes(Address(plane, x, y), BytesPerSample(), value);
 }
 
 void CBasicPixmap::ReadRow(std::uint32_t plane, std::int32_t x, std::int32_t y, std::uint32_t count,

@@ -14,7 +14,9 @@ constexpr const char* kOutsideText =
 constexpr const char* kDepthMismatchText =
     "$$$/Tarsa/Pixmap/Error/DepthMismatch=The images have different sample depths.";
 
-std::uint32_t Load(const std::uint8_t* at, std::size_t bytes) {
+}  // namespace
+
+std::uint32_t CPixmap::LoadBytes(const std::uint8_t* at, std::size_t bytes) {
   switch (bytes) {
     case 1:
       return *at;
@@ -31,7 +33,7 @@ std::uint32_t Load(const std::uint8_t* at, std::size_t bytes) {
   }
 }
 
-void Store(std::uint8_t* at, std::size_t bytes, std::uint32_t value) {
+void CPixmap::StoreBytes(std::uint8_t* at, std::size_t bytes, std::uint32_t value) {
   switch (bytes) {
     case 1:
       *at = std::uint8_t(value);
@@ -46,7 +48,6 @@ void Store(std::uint8_t* at, std::size_t bytes, std::uint32_t value) {
       break;
   }
 }
-}  // namespace
 
 CPixmap::CPixmap(const CRect& bounds, std::uint32_t planes, std::uint32_t depth)
     : bounds_(bounds), planes_(planes), depth_(depth) {}
@@ -69,7 +70,7 @@ void CPixmap::ReadRow(std::uint32_t plane, std::int32_t x, std::int32_t y, std::
   auto* bytes = static_cast<std::uint8_t*>(out);
   const std::size_t step = RowSampleBytes();
   for (std::uint32_t i = 0; i < count; ++i) {
-    Store(bytes + i * step, step, Sample(plane, x + std::int32_t(i), y));
+    StoreBytes(bytes + i * step, step, Sample(plane, x + std::int32_t(i), y));
   }
 }
 
@@ -79,7 +80,7 @@ void CPixmap::WriteRow(std::uint32_t plane, std::int32_t x, std::int32_t y, std:
   const auto* bytes = static_cast<const std::uint8_t*>(in);
   const std::size_t step = RowSampleBytes();
   for (std::uint32_t i = 0; i < count; ++i) {
-    SetSample(plane, x + std::int32_t(i), y, Load(bytes + i * step, step));
+    SetSample(plane, x + std::int32_t(i), y, LoadBytes(bytes + i * step, step));
   }
 }
 
@@ -88,7 +89,7 @@ void CPixmap::Fill(std::uint32_t plane, const CRect& area, std::uint32_t value) 
   if (r.IsEmpty() || plane >= planes_) return;
   const std::size_t step = RowSampleBytes();
   std::vector<std::uint8_t> row(std::size_t(r.Width()) * step);
-  for (std::size_t i = 0; i < std::size_t(r.Width()); ++i) Store(&row[i * step], step, value);
+  for (std::size_t i = 0; i < std::size_t(r.Width()); ++i) StoreBytes(&row[i * step], step, value);
   for (std::int32_t y = r.top; y < r.bottom; ++y) {
     WriteRow(plane, r.left, y, std::uint32_t(r.Width()), row.data());
   }

@@ -53,6 +53,9 @@ class CPixmap {
   void SetBounds(const CRect& bounds) { bounds_ = bounds; }
   // CError unless the run of a row lies in the pixmap.
   void CheckRow(std::uint32_t plane, std::int32_t x, std::int32_t y, std::uint32_t count) const;
+  // One sample of 1, 2 or 4 bytes in memory, in the machine's order.
+  static std::uint32_t LoadBytes(const std::uint8_t* at, std::size_t bytes);
+  static void StoreBytes(std::uint8_t* at, std::size_t bytes, std::uint32_t value);
 
  private:
   CRect bounds_;
