@@ -280,15 +280,31 @@ void GeodesicLines::TraceArc(LineRecord& line, const LineRecord& previous, const
   }
 }
 
-void GeodesicLines::WalkCells(LineRecord& line, const float from[2], const float to[2],
-                              Cell cellFrom, Cell cellTo, std::int32_t mode) const {
+GeodesicLines::Arc GeodesicLines::ArcBetween(const float from[2], const float to[2], Cell cellFrom,
+                                             Cell cellTo, std::int32_t mode) const {
   float a[3], b[3];
   SpherePoint(from, cellFrom, mode, a);
   SpherePoint(to, cellTo, mode, b);
+  Arc arc;
   const Vec3 endA = Vec3::From(a);
-  const Vec3 endB = Vec3::From(b);
-  const Vec3 n = Cross(endA, endB);
-  const double total = AngleBetween(endA, endB);
+  arc.endB = Vec3::From(b);
+  arc.normal = Cross(endA, arc.endB);
+  arc.total = AngleBetween(endA, arc.endB);
+  return arc;
+}
+
+void GeodesicLines::CellSphereCorners(Cell cell, std::int32_t mode, Vec3 out[4]) const {
+  float sphere[12];
+  GetCellSpherePoints(cell.i, cell.j, mode, sphere);
+  for (int k = 0; k < 4; ++k) out[k] = Vec3::From(sphere + 3 * k);
+}
+
+void GeodesicLines::WalkCells(LineRecord& line, const float from[2], const float to[2],
+                              Cell cellFrom, Cell cellTo, std::int32_t mode) const {
+  const Arc arc = ArcBetween(from, to, cellFrom, cellTo, mode);
+  const Vec3& endB = arc.endB;
+  const Vec3& n = arc.normal;
+  const double total = arc.total;
 
   line.samples.push_back(EndSample(from, cellFrom, mode, false, 0.0f));
   // Two equal ends span no circle: the line is degenerate.
@@ -297,9 +313,7 @@ void GeodesicLines::WalkCells(LineRecord& line, const float from[2], const float
   double best = total;
   while (walkOk && !(cell == cellTo)) {
     Vec3 corners[4];
-    float sphere[12];
-    GetCellSpherePoints(cell.i, cell.j, mode, sphere);
-    for (int k = 0; k < 4; ++k) corners[k] = Vec3::From(sphere + 3 * k);
+    CellSphereCorners(cell, mode, corners);
     float plane[8];
     GetCellCorners(cell.i, cell.j, mode, plane);
     const bool inside = QuadInside(cell);
@@ -348,13 +362,10 @@ void GeodesicLines::WalkCells(LineRecord& line, const float from[2], const float
 
 void GeodesicLines::WalkCellsTriangles(LineRecord& line, const float from[2], const float to[2],
                                        Cell cellFrom, Cell cellTo, std::int32_t mode) const {
-  float a[3], b[3];
-  SpherePoint(from, cellFrom, mode, a);
-  SpherePoint(to, cellTo, mode, b);
-  const Vec3 endA = Vec3::From(a);
-  const Vec3 endB = Vec3::From(b);
-  const Vec3 n = Cross(endA, endB);
-  const double total = AngleBetween(endA, endB);
+  const Arc arc = ArcBetween(from, to, cellFrom, cellTo, mode);
+  const Vec3& endB = arc.endB;
+  const Vec3& n = arc.normal;
+  const double total = arc.total;
 
   line.samples.push_back(EndSample(from, cellFrom, mode, true, 0.0f));
   bool walkOk = total > 0.0;
@@ -362,9 +373,7 @@ void GeodesicLines::WalkCellsTriangles(LineRecord& line, const float from[2], co
   double best = total;
   while (walkOk && !(cell == cellTo)) {
     Vec3 corners[4];
-    float sphere[12];
-    GetCellSpherePoints(cell.i, cell.j, mode, sphere);
-    for (int k = 0; k < 4; ++k) corners[k] = Vec3::From(sphere + 3 * k);
+    CellSphereCorners(cell, mode, corners);
     const bool inside = QuadInside(cell);
     bool moved = false;
     Cell next = cell;

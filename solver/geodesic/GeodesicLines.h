@@ -8,6 +8,7 @@
 
 #include "lens/sphere/PhotoToSphere.h"
 #include "solver/geodesic/LineRecords.h"
+#include "solver/geodesic/Vec3.h"
 #include "solver/grid/OctaMap.h"
 #include "solver/warp/SphereWarp.h"
 
@@ -150,6 +151,17 @@ class GeodesicLines {
   static constexpr float kMaxSnapPixels = 100.0f;
 
  private:
+  // The great circle through a line's two ends: the far end, the circle's
+  // normal and the angle between the ends.
+  struct Arc {
+    Vec3 endB;
+    Vec3 normal;
+    double total = 0.0;
+  };
+  Arc ArcBetween(const float from[2], const float to[2], Cell cellFrom, Cell cellTo,
+                 std::int32_t mode) const;
+  // A cell's four corners on the sphere, in this mode.
+  void CellSphereCorners(Cell cell, std::int32_t mode, Vec3 out[4]) const;
   bool QuadInside(Cell cell) const {
     return warp_ != nullptr && warp_->IsQuadInside(cell.i, cell.j);
   }
