@@ -7,7 +7,9 @@
 #include "filter/PFilter.h"
 #include "filter/PFinal.h"
 #include "filter/PResult.h"
+#include "filter/PResultScaled.h"
 #include "filter/PSource.h"
+#include "filter/PSourceScaled.h"
 #include "gpu/POpenGLManager.h"
 
 namespace Project {
@@ -51,7 +53,9 @@ PImageHub::~PImageHub() {
   Stop();
   glManager_->Shutdown();
   // Stages above first: they know the ones below by address.
+  resultScaled_.reset();
   resultFull_.reset();
+  sourceScaled_.reset();
   sourceFull_.reset();
 }
 
@@ -73,12 +77,42 @@ PResult& PImageHub::ResultFull() {
   return *resultFull_;
 }
 
+PSourceScaled& PImageHub::SourceScaled() {
+  if (sourceScaled_ == nullptr) {
+    sourceScaled_ = std::make_unique<PSourceScaled>(Source());
+    sourceScaled_->SetRects(displayRect_, sourceRect_);
+  }
+  return *sourceScaled_;
+}
+
+PResultScaled& PImageHub::ResultScaled() {
+  if (resultScaled_ == nullptr) {
+    resultScaled_ = std::make_unique<PResultScaled>(ResultFull());
+    resultScaled_->SetRects(displayRect_, sourceRect_);
+  }
+  return *resultScaled_;
+}
+
+void PImageHub::SetDisplayRect(const Tarsa::CRect& rect) {
+  if (rect == displayRect_) return;
+  displayRect_ = rect;
+  if (sourceScaled_ != nullptr) sourceScaled_->SetRects(displayRect_, sourceRect_);
+  if (resultScaled_ != nullptr) resultScaled_->SetRects(displayRect_, sourceRect_);
+}
+
 void PImageHub::RebuildResults() {
-  if (resultFull_ != nullptr) resultFull_->InvalidateAll();
+  if (resultFull_ == nullptr) return;
+  resultFull_->InvalidateAll();
+  ResultChanged(sourceRect_);
 }
 
 void PImageHub::SourceChanged(const Tarsa::CRect& area) {
+  if (sourceScaled_ != nullptr) sourceScaled_->InputChanged(area);
   if (resultFull_ != nullptr) resultFull_->Invalidate(area);
+}
+
+void PImageHub::ResultChanged(const Tarsa::CRect& area) {
+  if (resultScaled_ != nullptr) resultScaled_->InputChanged(area);
 }
 
 void PImageHub::Suspend() {

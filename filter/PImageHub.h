@@ -12,7 +12,9 @@ namespace Project {
 class PFilter;
 class POpenGLManager;
 class PResult;
+class PResultScaled;
 class PSource;
+class PSourceScaled;
 
 // The owner of every image stage of a run and of the OpenGL manager, and the
 // idler that advances the stages between events. Made by the filter's first
@@ -57,11 +59,22 @@ class PImageHub : public Tarsa::CIdler {
   PSource& Source();
   PResult& ResultFull();
   bool HasResultFull() const { return resultFull_ != nullptr; }
+  // The source and the full result reduced to the display area; the
+  // display rectangle must have been set.
+  PSourceScaled& SourceScaled();
+  PResultScaled& ResultScaled();
+
+  // The area on screen; empty until a preview shows. The scaled stages map
+  // it onto the source's rectangle.
+  void SetDisplayRect(const Tarsa::CRect& rect);
+  const Tarsa::CRect& DisplayRect() const { return displayRect_; }
 
   // The solver's geometry changed: every result is stale.
   void RebuildResults();
   // The source changed over area: the stages built on it are stale there.
   void SourceChanged(const Tarsa::CRect& area);
+  // The full result changed over area: its reduction is stale there.
+  void ResultChanged(const Tarsa::CRect& area);
 
   // Idle work runs only while no one holds the hub suspended.
   void Suspend();
@@ -87,8 +100,11 @@ class PImageHub : public Tarsa::CIdler {
   bool glUsable_ = false;
   bool npotTextures_ = false;
   std::uint32_t suspendCount_ = 0;
+  Tarsa::CRect displayRect_;
   std::unique_ptr<PSource> sourceFull_;
+  std::unique_ptr<PSourceScaled> sourceScaled_;
   std::unique_ptr<PResult> resultFull_;
+  std::unique_ptr<PResultScaled> resultScaled_;
 };
 
 }  // namespace Project

@@ -87,6 +87,7 @@ void PResult::Invalidate(const Tarsa::CRect& area) {
   if (stale.IsEmpty()) return;
   ClearCounts(stale);
   currentCol_ = currentRow_ = -1;
+  hub_.ResultChanged(stale);
 }
 
 void PResult::InvalidateAll() {

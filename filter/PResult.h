@@ -43,6 +43,7 @@ class PResult : public Tarsa::CPixProcess {
 
   const Tarsa::CRect& Rect() const { return rect_; }
   std::uint32_t Planes() const { return planes_; }
+  std::uint32_t PixelDepth() const { return depth_; }
   // Null until a rectangle is set.
   Tarsa::CVirtualPixmap* Pixels() { return pixels_.get(); }
   const CellSet& TileCells(std::int32_t col, std::int32_t row) const;

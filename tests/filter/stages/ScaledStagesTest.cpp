@@ -1,0 +1,138 @@
+// The display's reductions of the source and of the full result, each
+// against a box average of the full-size pixels computed here.
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <string>
+
+#include "filter/PImageHub.h"
+#include "filter/PResult.h"
+#include "filter/PResultScaled.h"
+#include "filter/PSource.h"
+#include "filter/PSourceScaled.h"
+#include "framework/plugin/CPluginEntry.h"
+#include "tests/filter/spine/SpineFixture.h"
+#include "tests/framework/plugin/RealHost.h"
+
+// Mesa's EGL keeps a one-time allocation of its driver's start-up.
+extern "C" const char* __lsan_default_suppressions() { return "leak:libEGL_mesa.so\n"; }
+
+namespace Project::testing {
+namespace {
+
+using Host::ImageMode;
+
+class StageFilter : public TestPFilter {
+ public:
+  std::string ShaderFile() const override {
+    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
+  }
+};
+
+// A pattern with detail at every scale, so that a box misplaced by one
+// sample shows.
+void FillPattern(Host::HostDocument& document) {
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (std::int32_t y = 0; y < document.Height(); ++y) {
+      for (std::int32_t x = 0; x < document.Width(); ++x)
+        document.SetSample(p, x, y, (x * 7 + y * 13 + p * 50 + (x * y) % 17) % 256);
+    }
+  }
+}
+
+// The largest difference between the reduced pixmap over bounds and the
+// mean of each factor x factor block of the full one, over the first
+// `planes` planes.
+double WorstBoxError(const Tarsa::CPixmap& full, const Tarsa::CPixmap& reduced,
+                     const Tarsa::CRect& bounds, std::int32_t factor, std::uint32_t planes) {
+  double worst = 0.0;
+  for (std::uint32_t p = 0; p < planes; ++p) {
+    for (std::int32_t y = bounds.top; y < bounds.bottom; ++y) {
+      for (std::int32_t x = bounds.left; x < bounds.right; ++x) {
+        double sum = 0.0;
+        for (std::int32_t dy = 0; dy < factor; ++dy) {
+          for (std::int32_t dx = 0; dx < factor; ++dx)
+            sum += full.Sample(p, x * factor + dx, y * factor + dy);
+        }
+        worst = std::max(worst, std::fabs(sum / (factor * factor) - reduced.Sample(p, x, y)));
+      }
+    }
+  }
+  return worst;
+}
+
+class ScaledStages : public ::testing::Test {
+ protected:
+  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
+  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
+  ScopedConfigHome config;
+};
+
+// A third of the picture's size: four sub-blocks a tile side (doubling
+// while the ratio is above the count), and every display pixel the mean of
+// its 3 x 3 block, in the source and in the solved result alike.
+TEST_F(ScaledStages, SourceAndResultShrinkToTheDisplay) {
+  Tarsa::testing::RealHost host(ImageMode::kRgb, 420, 300, false);
+  FillPattern(*host.document);
+  StageFilter filter;
+  ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
+  ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
+  PImageHub& hub = filter.ImageHub();
+  hub.SetDisplayRect({0, 0, 140, 100});
+
+  PSourceScaled& source = hub.SourceScaled();
+  EXPECT_EQ(source.StepsX(), 4u);
+  EXPECT_EQ(source.StepsY(), 4u);
+  ASSERT_NE(source.RunAll(true, 0, 0), 0);
+  EXPECT_EQ(source.DoneSteps(), source.TotalSteps());
+  // The reduction rounds its mean to the nearest sample.
+  EXPECT_LE(WorstBoxError(*hub.Source().Pixels(), *source.Pixels(), source.Destination(), 3, 3),
+            0.5 + 1e-6);
+
+  PResultScaled& result = hub.ResultScaled();
+  ASSERT_NE(result.RunAll(true, 0, 0), 0);
+  EXPECT_LE(WorstBoxError(*hub.ResultFull().Pixels(), *result.Pixels(), result.Destination(), 3, 4),
+            0.5 + 1e-6);
+
+  // A changed source area makes again just the display tiles that show it
+  // (with a pixel's margin), and the full result's tiles below them.
+  const std::uint32_t kept = hub.Source().Pixels()->Sample(0, 200, 200);
+  hub.Source().Invalidate({0, 0, 30, 30});
+  EXPECT_EQ(source.Counter(0, 0), 0u);
+  EXPECT_EQ(source.Counter(1, 0), source.StepsPerCell());
+  EXPECT_EQ(result.Counter(0, 0), 0u);
+  EXPECT_EQ(result.Counter(1, 0), result.StepsPerCell());
+  // The host's document now holds the scripted run's result; turned over,
+  // it tells a tile read again from one kept.
+  for (std::int32_t y = 0; y < 300; ++y) {
+    for (std::int32_t x = 0; x < 420; ++x)
+      host.document->SetSample(0, x, y, 255 - host.document->Sample(0, x, y));
+  }
+  ASSERT_NE(source.RunAll(true, 0, 0), 0);
+  // Only the first tile was read again: beyond it the old samples stay.
+  EXPECT_LE(WorstBoxError(*hub.Source().Pixels(), *source.Pixels(), source.Destination(), 3, 3),
+            0.5 + 1e-6);
+  EXPECT_EQ(hub.Source().Pixels()->Sample(0, 0, 0), std::uint32_t(host.document->Sample(0, 0, 0)));
+  EXPECT_EQ(hub.Source().Pixels()->Sample(0, 200, 200), kept);
+}
+
+// A display as large as the picture: one block a tile, an exact copy.
+TEST_F(ScaledStages, SameSizeCopies) {
+  Tarsa::testing::RealHost host(ImageMode::kRgb, 200, 150, false);
+  FillPattern(*host.document);
+  StageFilter filter;
+  ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
+  ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
+  PImageHub& hub = filter.ImageHub();
+  hub.SetDisplayRect({0, 0, 200, 150});
+  PSourceScaled& source = hub.SourceScaled();
+  EXPECT_EQ(source.StepsPerCell(), 1u);
+  ASSERT_NE(source.RunAll(true, 0, 0), 0);
+  EXPECT_EQ(WorstBoxError(*hub.Source().Pixels(), *source.Pixels(), source.Destination(), 1, 4),
+            0.0);
+}
+
+}  // namespace
+}  // namespace Project::testing
