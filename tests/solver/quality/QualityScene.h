@@ -33,6 +33,7 @@
 #include "solver/frame/Solver.h"
 #include "solver/frame/SolverContext.h"
 #include "solver/iterative/IterativeWarpSolver.h"
+#include "tests/support/StraightLineFit.h"
 #include "tools/synth/lib/Camera.h"
 #include "tools/synth/lib/Projection.h"
 #include "tools/synth/lib/RenderSpec.h"
@@ -499,34 +500,8 @@ struct Straightness {
 // The total least-squares line through the points and the points' distances
 // to it.
 inline Straightness FitStraightLine(const std::vector<Point>& points) {
-  Straightness fit;
-  fit.points = points.size();
-  if (points.size() < 2) return fit;
-  double cx = 0.0, cy = 0.0;
-  for (const Point& p : points) {
-    cx += p.x;
-    cy += p.y;
-  }
-  cx /= static_cast<double>(points.size());
-  cy /= static_cast<double>(points.size());
-  double sxx = 0.0, sxy = 0.0, syy = 0.0;
-  for (const Point& p : points) {
-    sxx += (p.x - cx) * (p.x - cx);
-    sxy += (p.x - cx) * (p.y - cy);
-    syy += (p.y - cy) * (p.y - cy);
-  }
-  // The direction of largest spread: the major axis of the scatter.
-  const double theta = 0.5 * std::atan2(2.0 * sxy, sxx - syy);
-  const double nx = -std::sin(theta), ny = std::cos(theta);
-  double sum = 0.0;
-  for (const Point& p : points) {
-    const double d = std::fabs((p.x - cx) * nx + (p.y - cy) * ny);
-    fit.maxDeviation = std::max(fit.maxDeviation, d);
-    sum += d * d;
-  }
-  fit.rms = std::sqrt(sum / static_cast<double>(points.size()));
-  fit.angleDegrees = theta * 180.0 / std::numbers::pi;
-  return fit;
+  const testing::StraightLineFit fit = testing::FitStraightLine(points);
+  return {fit.maxDeviation, fit.rms, fit.angle * 180.0 / std::numbers::pi, fit.points};
 }
 
 // How far a fitted direction is from the one a pinned line must take.
