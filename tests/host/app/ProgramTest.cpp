@@ -35,10 +35,12 @@ std::string Quoted(const std::string& text) {
   return quoted + "'";
 }
 
-// Runs the program with its output captured, in files outside the folder.
+// Runs the program with its output captured, in files outside the folder,
+// and the module's preferences in a fresh folder of their own, so that no
+// run sees another's or the user's.
 Result RunProgram(const std::vector<std::string>& arguments) {
   const ScratchFolder capture;
-  std::string command = Quoted(ARCHWAY_RUNNER);
+  std::string command = "XDG_CONFIG_HOME=" + Quoted(capture.Dir()) + " " + Quoted(ARCHWAY_RUNNER);
   for (const std::string& argument : arguments) command += " " + Quoted(argument);
   const std::string output = capture.File("stdout"), errors = capture.File("stderr");
   const int raw = std::system(
