@@ -38,6 +38,20 @@ int BlankSample(ImageMode mode, int plane, int colourPlanes) {
 HostDocument::HostDocument(int32_t width, int32_t height, ImageMode mode, bool hasTransparency)
     : width_(width), height_(height), mode_(mode), hasTransparency_(hasTransparency) {}
 
+std::unique_ptr<HostDocument> HostDocument::Duplicate() const {
+  std::unique_ptr<HostDocument> copy = CreateUnfilled(width_, height_, mode_, hasTransparency_);
+  for (int p = 0; p < PlaneCount(); ++p) {
+    if (Depth() == 16) {
+      std::ranges::copy(Plane16(p), copy->Plane16(p).begin());
+    } else {
+      std::ranges::copy(Plane8(p), copy->Plane8(p).begin());
+    }
+  }
+  copy->SetResolution(resolutionX_, resolutionY_);
+  copy->SetSource(sourcePath_, sourceFormat_);
+  return copy;
+}
+
 std::unique_ptr<HostDocument> HostDocument::CreateUnfilled(int32_t width, int32_t height,
                                                            ImageMode mode, bool hasTransparency) {
   if (!IsImageMode(static_cast<int>(mode))) {

@@ -32,6 +32,9 @@ class HostDocument {
   static std::unique_ptr<HostDocument> CreateUnfilled(int32_t width, int32_t height, ImageMode mode,
                                                       bool hasTransparency);
 
+  // A copy of every sample, the resolution and the source; throws as Create.
+  std::unique_ptr<HostDocument> Duplicate() const;
+
   HostDocument(const HostDocument&) = delete;
   HostDocument& operator=(const HostDocument&) = delete;
 

@@ -4,6 +4,7 @@
 #include <cstring>
 #include <limits>
 #include <new>
+#include <utility>
 
 #include "host/plugin/HostCodes.h"
 
@@ -58,6 +59,7 @@ void BlockExchange::Transfer(const Block& block, bool toDocument) {
 void BlockExchange::Commit() {
   if (out_ == nullptr) return;
   const std::unique_ptr<Block> block = std::move(out_);
+  if (beforeFirstWrite_) std::exchange(beforeFirstWrite_, nullptr)();
   if (document_.Depth() == 16) {
     Transfer<uint16_t>(*block, true);
   } else {

@@ -2,6 +2,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 
 #include "framework/plugin/HostFilterRecord.h"
@@ -33,6 +34,8 @@ class BlockExchange {
   int16_t Advance();
   // Copies the block out, if any, back into the document.
   void Commit();
+  // Called once, before the first block goes back into the document.
+  void SetBeforeFirstWrite(std::function<void()> call) { beforeFirstWrite_ = std::move(call); }
   // Whether the record asks for a block (a non-empty out rectangle).
   bool HasRequest() const;
   // Bytes left unused at the end of each row of the blocks handed out, as a
@@ -56,6 +59,7 @@ class BlockExchange {
   Tarsa::HostFilterRecord& record_;
   std::unique_ptr<Block> out_;
   size_t rowPadding_ = 0;
+  std::function<void()> beforeFirstWrite_;
 };
 
 }  // namespace Host

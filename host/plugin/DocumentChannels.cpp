@@ -99,6 +99,10 @@ Tarsa::HostChannelPortsSuite MakePortsSuite() {
 
 }  // namespace
 
+void DocumentChannels::ReadFrom(const HostDocument& document) {
+  for (const std::unique_ptr<Port>& port : ports_) port->document = &document;
+}
+
 DocumentChannels::DocumentChannels(const HostDocument& document)
     : info_(std::make_unique<Tarsa::HostDocumentInfo>()) {
   *info_ = {};

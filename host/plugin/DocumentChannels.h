@@ -28,6 +28,9 @@ class DocumentChannels {
   DocumentChannels& operator=(const DocumentChannels&) = delete;
 
   Tarsa::HostDocumentInfo* Info() { return info_.get(); }
+  // Reads from now on come from document, which has the same size, mode and
+  // planes and must outlive this.
+  void ReadFrom(const HostDocument& document);
   // The node of a plane, colour planes first; for tests.
   const Tarsa::HostChannelNode* Node(int plane) const { return nodes_[plane].get(); }
 

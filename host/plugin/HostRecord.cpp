@@ -76,6 +76,10 @@ HostRecord::HostRecord(HostDocument& document, Settings settings, RunObserver& o
       blocks_(std::make_unique<BlockExchange>(document, *record_)),
       properties_(std::make_unique<HostProperties>(std::move(settings.properties))) {
   properties_->SetDocumentPath(document.SourcePath());
+  blocks_->SetBeforeFirstWrite([this, &document] {
+    original_ = document.Duplicate();
+    channels_->ReadFrom(*original_);
+  });
   const int32_t width = document.Width();
   const int32_t height = document.Height();
   Tarsa::HostFilterRecord& r = *record_;

@@ -78,6 +78,11 @@ class HostRecord {
   std::unique_ptr<Tarsa::HostCoordinates32> coordinates_;
   std::unique_ptr<Tarsa::HostScriptBlock> script_;
   std::unique_ptr<void*[]> platform_;
+  // The document as the run found it, kept from the first block written
+  // back: the filter reads its planes from here while the blocks change the
+  // document itself, so that a tile drawn late never reads pixels an earlier
+  // tile already replaced.
+  std::unique_ptr<const HostDocument> original_;
   std::unique_ptr<DocumentChannels> channels_;
   std::unique_ptr<BlockExchange> blocks_;
   std::unique_ptr<HostProperties> properties_;
