@@ -436,6 +436,10 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   pass.textured = filter_.Settings().textureRendering != 0;
   pass.textureWidth = textureWidth_;
   pass.textureHeight = textureHeight_;
+  pass.pictureTexels[0] = float(padLeft_);
+  pass.pictureTexels[1] = float(padTop_);
+  pass.pictureTexels[2] = float(padLeft_ + sourceWidth_ - 1);
+  pass.pictureTexels[3] = float(padTop_ + sourceHeight_ - 1);
   pass.textureFormat = hub_.TextureFormat();
   pass.pixelFormat = hub_.PixelFormat();
   pass.pixelType = hub_.PixelType();

@@ -35,6 +35,7 @@ struct POpenGLManager::Functions {
   PFNGLDELETEPROGRAMPROC glDeleteProgram = nullptr;
   PFNGLGETUNIFORMLOCATIONPROC glGetUniformLocation = nullptr;
   PFNGLUNIFORM2FPROC glUniform2f = nullptr;
+  PFNGLUNIFORM4FPROC glUniform4f = nullptr;
   PFNGLCREATEPROGRAMPROC glCreateProgram = nullptr;
   PFNGLLINKPROGRAMPROC glLinkProgram = nullptr;
   PFNGLVALIDATEPROGRAMPROC glValidateProgram = nullptr;
@@ -57,7 +58,7 @@ struct POpenGLManager::Functions {
   }
 
   bool HasShader() const {
-    return glUseProgram && glDeleteProgram && glGetUniformLocation && glUniform2f &&
+    return glUseProgram && glDeleteProgram && glGetUniformLocation && glUniform2f && glUniform4f &&
            glCreateProgram && glLinkProgram && glValidateProgram && glGetProgramiv &&
            glGetProgramInfoLog && glCreateShader && glShaderSource && glCompileShader &&
            glGetShaderiv && glGetShaderInfoLog && glAttachShader && glDeleteShader;
@@ -321,6 +322,7 @@ void POpenGLManager::LoadFunctions() {
   load(f.glDeleteProgram, "glDeleteProgram");
   load(f.glGetUniformLocation, "glGetUniformLocation");
   load(f.glUniform2f, "glUniform2f");
+  load(f.glUniform4f, "glUniform4f");
   load(f.glCreateProgram, "glCreateProgram");
   load(f.glLinkProgram, "glLinkProgram");
   load(f.glValidateProgram, "glValidateProgram");
@@ -449,12 +451,14 @@ void POpenGLManager::UseShader() {
   if (shaderReady_) functions_->glUseProgram(shaderProgram_);
 }
 
-void POpenGLManager::SetShaderSizes(float texelWidth, float texelHeight, float width,
-                                    float height) {
+void POpenGLManager::SetShaderSizes(float texelWidth, float texelHeight, float width, float height,
+                                    const float pictureTexels[4]) {
   if (!shaderReady_) return;
   const Functions& f = *functions_;
   f.glUniform2f(f.glGetUniformLocation(shaderProgram_, "texelSize"), texelWidth, texelHeight);
   f.glUniform2f(f.glGetUniformLocation(shaderProgram_, "textureSize"), width, height);
+  f.glUniform4f(f.glGetUniformLocation(shaderProgram_, "pictureTexels"), pictureTexels[0],
+                pictureTexels[1], pictureTexels[2], pictureTexels[3]);
 }
 
 void POpenGLManager::Shutdown() {

@@ -90,10 +90,12 @@ class POpenGLManager {
   bool MadeCurrent() const { return madeCurrent_; }
   bool ShaderReady() const { return shaderReady_; }
 
-  // With the shader ready: use it, and set its uniforms "texelSize" and
-  // "textureSize". Call with the context current.
+  // With the shader ready: use it, and set its uniforms "texelSize",
+  // "textureSize" and "pictureTexels" (the first and last texel, x and y,
+  // that hold the picture's pixels). Call with the context current.
   void UseShader();
-  void SetShaderSizes(float texelWidth, float texelHeight, float width, float height);
+  void SetShaderSizes(float texelWidth, float texelHeight, float width, float height,
+                      const float pictureTexels[4]);
 
  private:
   struct Functions;

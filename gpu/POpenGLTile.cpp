@@ -38,7 +38,8 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
       glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MIN_FILTER, filter);
       glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MAG_FILTER, filter);
       manager.SetShaderSizes(1.0f / float(pass.textureWidth), 1.0f / float(pass.textureHeight),
-                             float(pass.textureWidth), float(pass.textureHeight));
+                             float(pass.textureWidth), float(pass.textureHeight),
+                             pass.pictureTexels);
       glTexImage2D(GL_TEXTURE_2D, 0, GLint(pass.textureFormat), pass.textureWidth,
                    pass.textureHeight, 0, pass.pixelFormat, pass.pixelType, pass.texels);
     } else {

@@ -32,6 +32,9 @@ struct POpenGLTilePass {
   const void* texels = nullptr;
   int textureWidth = 0;
   int textureHeight = 0;
+  // The texels that hold the picture's pixels, first and last, x then y:
+  // the rest is margin, where the result is transparent.
+  float pictureTexels[4] = {0, 0, 0, 0};
   std::uint32_t textureFormat = 0;
   std::uint32_t pixelFormat = 0;
   std::uint32_t pixelType = 0;

@@ -11,16 +11,19 @@
 // hardware's bilinear filtering, which GL_NEAREST rules out anyway.
 //
 // Channels are interpolated as they are stored, as GL_LINEAR would, so the
-// result matches the path without this shader. Outside the texture the result
-// is transparent, never a repeat of the edge; fetches the kernel needs beyond
-// the edge take the edge texel, so no dark or transparent fringe runs inside.
+// result matches the path without this shader. The texture may hold empty
+// margins around the picture's pixels: beyond the picture's edge the result
+// is transparent, never a repeat of the edge, and fetches the kernel needs
+// beyond the edge take the edge texel, so the picture keeps a hard edge with
+// no dark or transparent fringe inside, whether or not a tile has margins.
 
 uniform sampler2D source;
-uniform vec2 texelSize;    // 1 / width, 1 / height
-uniform vec2 textureSize;  // width, height in texels
+uniform vec2 texelSize;       // 1 / width, 1 / height
+uniform vec2 textureSize;     // width, height in texels
+uniform vec4 pictureTexels;   // first texel x, y and last texel x, y of the picture
 
 vec4 Texel(vec2 index) {
-  vec2 inside = clamp(index, vec2(0.0), textureSize - vec2(1.0));
+  vec2 inside = clamp(index, pictureTexels.xy, pictureTexels.zw);
   return texture2D(source, (inside + vec2(0.5)) * texelSize);
 }
 
@@ -35,14 +38,12 @@ vec4 Weights(float t) {
 }
 
 void main() {
-  vec2 uv = gl_TexCoord[0].st;
-  if (any(lessThan(uv, vec2(0.0))) || any(greaterThan(uv, vec2(1.0)))) {
-    gl_FragColor = vec4(0.0);
-    return;
-  }
+  // Texel centres lie at whole numbers in p; the picture covers half a
+  // texel beyond its first and last centres.
+  vec2 p = gl_TexCoord[0].st * textureSize - vec2(0.5);
+  bool outside = any(lessThan(p, pictureTexels.xy - vec2(0.5))) ||
+                 any(greaterThan(p, pictureTexels.zw + vec2(0.5)));
 
-  // Texel centres lie at whole numbers in p.
-  vec2 p = uv * textureSize - vec2(0.5);
   vec2 base = floor(p);
   vec2 t = p - base;
   vec4 wx = Weights(t.x);
@@ -58,5 +59,5 @@ void main() {
   }
   // The kernel's negative lobes overshoot near steps; stay within the
   // range a colour can have.
-  gl_FragColor = clamp(sum, 0.0, 1.0);
+  gl_FragColor = outside ? vec4(0.0) : clamp(sum, 0.0, 1.0);
 }

@@ -15,12 +15,7 @@
 #include "tests/filter/render/ReferenceRender.h"
 #include "tests/filter/spine/SpineFixture.h"
 #include "tests/framework/plugin/RealHost.h"
-
-// Mesa's EGL keeps a one-time allocation of its driver's start-up for the
-// life of the process. The slow unwinder is not asked for here: llvmpipe's
-// shader compiler registers unwind tables under the unwinder's own lock, and
-// a slow unwind of that allocation deadlocks.
-extern "C" const char* __lsan_default_suppressions() { return "leak:libEGL_mesa.so\n"; }
+#include "tests/support/MesaUnderSanitizers.h"
 
 namespace Project::testing {
 namespace {

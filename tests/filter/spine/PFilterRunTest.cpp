@@ -13,12 +13,10 @@
 #include "tests/filter/spine/SpineFixture.h"
 #include "tests/framework/plugin/RealHost.h"
 #include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/MesaUnderSanitizers.h"
 
-// The leak checker's suppressions for this program: Mesa's EGL keeps a
-// one-time allocation of its driver's start-up for the life of the process.
 // The driver has no frame pointers, so only the slow unwinder reaches the
 // EGL frame that the suppression names.
-extern "C" const char* __lsan_default_suppressions() { return "leak:libEGL_mesa.so\n"; }
 extern "C" const char* __asan_default_options() { return "fast_unwind_on_malloc=0"; }
 
 namespace Project::testing {
