@@ -24,9 +24,14 @@
 #include <string>
 #include <vector>
 
+#include "bench/BenchSupport.h"
 #include "tests/solver/quality/QualityScene.h"
 
 namespace {
+
+using Project::bench::Median;
+using Project::bench::ResetPeak;
+using Project::bench::StatusKb;
 
 using namespace Project;
 using namespace Project::quality;
@@ -44,22 +49,6 @@ struct Variant {
   // rather than the solve of all of them on the plain mesh.
   bool edit = false;
 };
-
-// A line of /proc/self/status in kilobytes, 0 when absent.
-double StatusKb(const char* key) {
-  std::ifstream status("/proc/self/status");
-  std::string line;
-  while (std::getline(status, line)) {
-    if (line.rfind(key, 0) == 0) return std::atof(line.c_str() + std::strlen(key));
-  }
-  return 0.0;
-}
-
-// Lowers the high-water mark of the resident set to the present size.
-void ResetPeak() {
-  std::ofstream clear("/proc/self/clear_refs");
-  clear << "5";
-}
 
 struct Timing {
   double seconds = 0.0;
@@ -134,12 +123,6 @@ class Bench {
   bool edit_;
   bool solvedBefore_ = false;
 };
-
-double Median(std::vector<double> values) {
-  if (values.empty()) return 0.0;
-  std::sort(values.begin(), values.end());
-  return values[values.size() / 2];
-}
 
 // Runs the variant and the baseline alternately, times the variant, and
 // reports medians and their ratio under the name `ratio`.

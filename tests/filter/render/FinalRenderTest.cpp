@@ -22,13 +22,6 @@ namespace {
 
 using Host::ImageMode;
 
-class RenderFilter : public TestPFilter {
- public:
-  std::string ShaderFile() const override {
-    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
-  }
-};
-
 // The real host, with a cancel at a chosen abort check and the progress kept.
 class CallbackHost : public Tarsa::testing::RealHost {
  public:
@@ -87,7 +80,7 @@ class FinalRender : public ::testing::Test {
 
   // A scripted run over host's document; answers the start selector's code
   // and leaves the filter's solved mesh in filter.
-  std::int16_t RunScripted(CallbackHost& host, RenderFilter& filter) {
+  std::int16_t RunScripted(CallbackHost& host, ShaderPFilter& filter) {
     if (filter.HandlePrepare(host.Record(), nullptr) != 0) return -1;
     return filter.HandleStart(host.Record(), nullptr);
   }
@@ -155,7 +148,7 @@ TEST_F(FinalRender, TiledResultMatchesTheMeshRenderedWhole) {
   CallbackHost host(ImageMode::kRgb, 333, 222, true);
   FillSmooth(*host.document);
   const auto before = Copy(*host.document);
-  RenderFilter filter;
+  ShaderPFilter filter;
   ASSERT_EQ(RunScripted(host, filter), 0);
   const Tally tally = Compare(*before, *host.document, filter.Constraints().GetSolver(),
                               // float rounding on the GPU against double here: one step
@@ -183,7 +176,7 @@ TEST_F(FinalRender, EveryModeComesBackRight) {
       CallbackHost host(mode, 150, 100, transparency);
       FillSmooth(*host.document);
       const auto before = Copy(*host.document);
-      RenderFilter filter;
+      ShaderPFilter filter;
       ASSERT_EQ(RunScripted(host, filter), 0);
       const int tolerance = Host::DepthOf(mode) == 8
                                 // as in the whole-image comparison
@@ -205,7 +198,7 @@ TEST_F(FinalRender, EveryModeComesBackRight) {
 TEST_F(FinalRender, ProgressRunsToTheTotalAndCancelWritesNothing) {
   {
     CallbackHost host(ImageMode::kRgb, 300, 200, false);
-    RenderFilter filter;
+    ShaderPFilter filter;
     ASSERT_EQ(RunScripted(host, filter), 0);
     ASSERT_GE(host.progress.size(), 2u);
     const auto total = host.progress.front().second;
@@ -219,7 +212,7 @@ TEST_F(FinalRender, ProgressRunsToTheTotalAndCancelWritesNothing) {
     CallbackHost host(ImageMode::kRgb, 300, 200, false);
     const auto before = Copy(*host.document);
     host.abortAtCheck = 0;
-    RenderFilter filter;
+    ShaderPFilter filter;
     EXPECT_EQ(RunScripted(host, filter), 1) << "a cancelled run answers 1";
     EXPECT_EQ(host.advanceCalls, 0) << "nothing went to the host";
     EXPECT_EQ(host.progress.size(), 1u);

@@ -29,13 +29,6 @@ namespace {
 using Host::ImageMode;
 using Tarsa::testing::RealHost;
 
-class ShaderFilter : public TestPFilter {
- public:
-  std::string ShaderFile() const override {
-    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
-  }
-};
-
 class RenderRun : public ::testing::Test {
  protected:
   void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
@@ -95,7 +88,7 @@ TEST_F(Margins, OutsideThePictureIsZeroNotTheEdgeRepeated) {
       for (std::int32_t y = 0; y < kHeight; ++y)
         for (std::int32_t x = 0; x < kWidth; ++x) document.SetSample(p, x, y, inside[p]);
     const ScriptedScale scale(host, 100);
-    ShaderFilter filter;
+    ShaderPFilter filter;
     ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
     ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
     ASSERT_EQ(filter.Settings().imageScale, 100) << "the run took the scripted scale";
@@ -177,7 +170,7 @@ void RenderWithLimit(std::uint64_t limit, const std::string& scratch, Rendered& 
     const auto plane = host.document->Plane16(p);
     source.emplace_back(plane.begin(), plane.end());
   }
-  ShaderFilter filter;
+  ShaderPFilter filter;
   ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
   Tarsa::CMemoryService* service = Tarsa::CMemoryService::Get(false);
   ASSERT_NE(service, nullptr) << "the prepare set up the memory service";

@@ -27,6 +27,17 @@ class TestPFilter : public PFilter {
   std::uint32_t HeldModifiers() const override { return heldKeys; }
 };
 
+#ifdef ARCHWAY_REQUIRED_DIR
+// The same, with the fragment shader read from the source tree rather than
+// from beside a host executable.
+class ShaderPFilter : public TestPFilter {
+ public:
+  std::string ShaderFile() const override {
+    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
+  }
+};
+#endif
+
 // Points the user's configuration folder at a fresh folder for one test,
 // so preferences are read and written there; puts the old one back after.
 class ScopedConfigHome {

@@ -22,13 +22,6 @@ namespace {
 
 using Host::ImageMode;
 
-class StageFilter : public TestPFilter {
- public:
-  std::string ShaderFile() const override {
-    return std::string(ARCHWAY_REQUIRED_DIR) + "/ArchwayFragmentShader.fsh";
-  }
-};
-
 // A pattern with detail at every scale, so that a box misplaced by one
 // sample shows.
 void FillPattern(Host::HostDocument& document) {
@@ -74,7 +67,7 @@ class ScaledStages : public ::testing::Test {
 TEST_F(ScaledStages, SourceAndResultShrinkToTheDisplay) {
   Tarsa::testing::RealHost host(ImageMode::kRgb, 420, 300, false);
   FillPattern(*host.document);
-  StageFilter filter;
+  ShaderPFilter filter;
   ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
   ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
   PImageHub& hub = filter.ImageHub();
@@ -112,7 +105,7 @@ TEST_F(ScaledStages, SourceAndResultShrinkToTheDisplay) {
 TEST_F(ScaledStages, SameSizeCopies) {
   Tarsa::testing::RealHost host(ImageMode::kRgb, 200, 150, false);
   FillPattern(*host.document);
-  StageFilter filter;
+  ShaderPFilter filter;
   ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
   ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
   PImageHub& hub = filter.ImageHub();
