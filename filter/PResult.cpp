@@ -18,7 +18,6 @@ namespace Project {
 namespace {
 
 constexpr std::int32_t kTile = 128;
-constexpr std::int32_t kTileClass = -2;  // 128 x 128 tiles of the virtual pixmap
 
 // The source planes that fill a texture's R, G, B and A. Gray repeats its
 // one plane in R, G and B; a fifth plane goes in a second pass's A.
@@ -64,19 +63,10 @@ void PResult::SetRect(const Tarsa::CRect& rect) {
     Clear();
     return;
   }
-  const auto width = std::int32_t(rect.Width());
-  const auto height = std::int32_t(rect.Height());
-  const std::uint32_t depthCode = depth_ == 16 ? 4 : 3;
-  if (pixels_ == nullptr) {
-    pixels_ = std::make_unique<Tarsa::CVirtualPixmap>(depthCode, width, height, planes_, kTileClass,
-                                                      Tarsa::CPoint{1, 1});
-  } else if (rect != rect_) {
-    pixels_->Resize(width, height);
-  }
-  pixels_->SetOrigin({rect.left, rect.top});
+  PlaceStagePixels(pixels_, rect, depth_, planes_);
   rect_ = rect;
-  resultWidth_ = width;
-  resultHeight_ = height;
+  resultWidth_ = std::int32_t(rect.Width());
+  resultHeight_ = std::int32_t(rect.Height());
   Layout(rect, TileRect({rect.left, rect.top}, 0, 0));
   SetStepsPerCell(1);
   BuildTileIndex();

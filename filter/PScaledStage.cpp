@@ -9,7 +9,6 @@ namespace Project {
 namespace {
 
 constexpr std::int32_t kTile = 128;
-constexpr std::int32_t kTileClass = -2;  // 128 x 128 tiles, as every stage
 constexpr std::uint32_t kMostSubBlocks = 64;
 
 // Sub-blocks per tile along an axis: enough that each reads about a tile's
@@ -51,15 +50,7 @@ void PScaledStage::SetRects(const Tarsa::CRect& target, const Tarsa::CRect& orig
     return;
   }
   if (!CPixScaler::SetRects(target, origin) && pixels_ != nullptr) return;
-  const auto width = std::int32_t(target.Width());
-  const auto height = std::int32_t(target.Height());
-  if (pixels_ == nullptr) {
-    pixels_ = std::make_unique<Tarsa::CVirtualPixmap>(depth_ == 16 ? 4 : 3, width, height, planes_,
-                                                      kTileClass, Tarsa::CPoint{1, 1});
-  } else {
-    pixels_->Resize(width, height);
-  }
-  pixels_->SetOrigin({target.left, target.top});
+  PlaceStagePixels(pixels_, target, depth_, planes_);
   Layout(target, TileRect({target.left, target.top}, 0, 0));
   stepsX_ = SubBlocks(ModeX(), origin.Width(), target.Width());
   stepsY_ = SubBlocks(ModeY(), origin.Height(), target.Height());

@@ -21,6 +21,19 @@ Tarsa::CRect TileRect(Tarsa::CPoint origin, std::int32_t col, std::int32_t row) 
                       Tarsa::CRect::Saturate(left + kTile), Tarsa::CRect::Saturate(top + kTile)};
 }
 
+void PlaceStagePixels(std::unique_ptr<Tarsa::CVirtualPixmap>& pixels, const Tarsa::CRect& rect,
+                      std::uint32_t depth, std::uint32_t planes) {
+  const auto width = std::int32_t(rect.Width());
+  const auto height = std::int32_t(rect.Height());
+  if (pixels == nullptr) {
+    pixels = std::make_unique<Tarsa::CVirtualPixmap>(depth == 16 ? 4 : 3, width, height, planes,
+                                                     kTileClass, Tarsa::CPoint{1, 1});
+  } else if (pixels->Width() != std::uint32_t(width) || pixels->Height() != std::uint32_t(height)) {
+    pixels->Resize(width, height);
+  }
+  pixels->SetOrigin({rect.left, rect.top});
+}
+
 bool BringUpToDate(Tarsa::CPixProcess& stage, const Tarsa::CRect& area, bool wait,
                    std::uint32_t& stepCount) {
   std::int32_t col = 0, row = 0;
@@ -50,16 +63,7 @@ void PSource::SetRect(const Tarsa::CRect& rect) {
     Clear();
     return;
   }
-  const auto width = std::int32_t(rect.Width());
-  const auto height = std::int32_t(rect.Height());
-  const std::uint32_t depthCode = depth_ == 16 ? 4 : 3;
-  if (pixels_ == nullptr) {
-    pixels_ = std::make_unique<Tarsa::CVirtualPixmap>(depthCode, width, height, planes_, kTileClass,
-                                                      Tarsa::CPoint{1, 1});
-  } else {
-    pixels_->Resize(width, height);
-  }
-  pixels_->SetOrigin({rect.left, rect.top});
+  PlaceStagePixels(pixels_, rect, depth_, planes_);
   rect_ = rect;
   Layout(rect, TileRect({rect.left, rect.top}, 0, 0));
   SetStepsPerCell(1);

@@ -55,6 +55,12 @@ class PSource : public Tarsa::CPixProcess {
 bool BringUpToDate(Tarsa::CPixProcess& stage, const Tarsa::CRect& area, bool wait,
                    std::uint32_t& stepCount);
 
+// Makes pixels a stage's pixmap over rect: a virtual pixmap of 128 x 128
+// tiles with a pixel's margin, of the kind for depth, or resizes the one
+// there when rect's size differs (contents then go); its origin is rect's.
+void PlaceStagePixels(std::unique_ptr<Tarsa::CVirtualPixmap>& pixels, const Tarsa::CRect& rect,
+                      std::uint32_t depth, std::uint32_t planes);
+
 // The 128 x 128 tile (col, row) of a lattice through origin, unclipped.
 Tarsa::CRect TileRect(Tarsa::CPoint origin, std::int32_t col, std::int32_t row);
 
