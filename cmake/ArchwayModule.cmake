@@ -3,7 +3,9 @@
 # variants: the plain one and a "_san" one built with AddressSanitizer and
 # UndefinedBehaviorSanitizer, so that one ctest run covers both.
 
-set(ARCHWAY_WARNINGS -Wall -Wextra -Werror)
+# g++ 12 at -O3 reports overlapping copies inside std::string's own inlined
+# code that cannot happen (a known false positive); it stays a warning there.
+set(ARCHWAY_WARNINGS -Wall -Wextra -Werror -Wno-error=restrict)
 # -O1 with line tables keeps the sanitizer variant quick to build while its
 # reports still name files and lines.
 set(ARCHWAY_SAN_FLAGS -fsanitize=address,undefined -fno-sanitize-recover=all

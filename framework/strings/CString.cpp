@@ -161,7 +161,8 @@ void CString::ParseEscapes() {
 CString CString::Replace(int index, const CString& value) const {
   CString copy = *this;
   copy.Resolve();
-  const std::string pattern = "^" + std::to_string(index);
+  std::string pattern = std::to_string(index);
+  pattern.insert(pattern.begin(), '^');
   const std::size_t at = copy.Str().find(pattern);
   if (at == std::string::npos) return copy;
   std::string out = copy.Str();
