@@ -5,6 +5,7 @@
 
 #include <cmath>
 #include <cstdint>
+#include <memory>
 #include <string>
 
 #include "filter/PImageHub.h"
@@ -57,7 +58,27 @@ double WorstBoxError(const Tarsa::CPixmap& full, const Tarsa::CPixmap& reduced,
 class ScaledStages : public ::testing::Test {
  protected:
   void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
-  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
+  void TearDown() override {
+    filter_.reset();
+    host_.reset();
+    Tarsa::CPluginEntry::TearDown();
+  }
+
+  // A scripted run over a patterned picture of that size, its hub showing
+  // the display rectangle.
+  PImageHub& RunShowing(std::int32_t width, std::int32_t height, const Tarsa::CRect& display) {
+    host_ = std::make_unique<Tarsa::testing::RealHost>(ImageMode::kRgb, width, height, false);
+    FillPattern(*host_->document);
+    filter_ = std::make_unique<ShaderPFilter>();
+    EXPECT_EQ(filter_->HandlePrepare(host_->Record(), nullptr), 0);
+    EXPECT_EQ(filter_->HandleStart(host_->Record(), nullptr), 0);
+    PImageHub& hub = filter_->ImageHub();
+    hub.SetDisplayRect(display);
+    return hub;
+  }
+
+  std::unique_ptr<Tarsa::testing::RealHost> host_;
+  std::unique_ptr<ShaderPFilter> filter_;
   ScopedConfigHome config;
 };
 
@@ -65,13 +86,7 @@ class ScaledStages : public ::testing::Test {
 // while the ratio is above the count), and every display pixel the mean of
 // its 3 x 3 block, in the source and in the solved result alike.
 TEST_F(ScaledStages, SourceAndResultShrinkToTheDisplay) {
-  Tarsa::testing::RealHost host(ImageMode::kRgb, 420, 300, false);
-  FillPattern(*host.document);
-  ShaderPFilter filter;
-  ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
-  ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
-  PImageHub& hub = filter.ImageHub();
-  hub.SetDisplayRect({0, 0, 140, 100});
+  PImageHub& hub = RunShowing(420, 300, {0, 0, 140, 100});
 
   PSourceScaled& source = hub.SourceScaled();
   EXPECT_EQ(source.StepsX(), 4u);
@@ -103,13 +118,7 @@ TEST_F(ScaledStages, SourceAndResultShrinkToTheDisplay) {
 
 // A display as large as the picture: one block a tile, an exact copy.
 TEST_F(ScaledStages, SameSizeCopies) {
-  Tarsa::testing::RealHost host(ImageMode::kRgb, 200, 150, false);
-  FillPattern(*host.document);
-  ShaderPFilter filter;
-  ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
-  ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
-  PImageHub& hub = filter.ImageHub();
-  hub.SetDisplayRect({0, 0, 200, 150});
+  PImageHub& hub = RunShowing(200, 150, {0, 0, 200, 150});
   PSourceScaled& source = hub.SourceScaled();
   EXPECT_EQ(source.StepsPerCell(), 1u);
   ASSERT_NE(source.RunAll(true, 0, 0), 0);
