@@ -13,11 +13,19 @@
 #include "gpu/POpenGLTile.h"
 #include "solver/frame/Solver.h"
 
+#if defined(__x86_64__) || defined(__i386__)
+#include <immintrin.h>
+#define ARCHWAY_X86_TEXELS 1
+#endif
+
 namespace Project {
 
 namespace {
 
 constexpr std::int32_t kTile = 128;
+// Texels go to the GL in bands of some 64 KiB, still in the cache from
+// their making.
+constexpr std::size_t kBandBytes = 64 * 1024;
 
 // The source planes that fill a texture's R, G, B and A. Gray repeats its
 // one plane in R, G and B; a fifth plane goes in a second pass's A.
@@ -29,6 +37,222 @@ std::array<std::uint32_t, 4> TexturePlanes(std::uint32_t planes, std::uint32_t p
 
 std::uint16_t UpTo16(std::uint32_t s) { return s < 32768 ? std::uint16_t(2 * s) : 65535; }
 std::uint16_t DownFrom16(std::uint32_t x) { return x < 65535 ? std::uint16_t(x / 2) : 32768; }
+
+std::uint16_t Load16(const std::uint8_t* at) {
+  std::uint16_t v;
+  std::memcpy(&v, at, 2);
+  return v;
+}
+
+void Store16(std::uint8_t* at, std::uint16_t v) { std::memcpy(at, &v, 2); }
+
+// Texture rows are made from one row of each channel's plane: the channels
+// are interleaved into RGBA texels, count of them at out.
+using ChannelRows = std::array<const std::uint8_t*, 4>;
+
+void Interleave8(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
+  std::size_t x = 0;
+#if defined(__SSE2__)
+  for (; x + 16 <= count; x += 16) {
+    const auto load = [x](const std::uint8_t* row) {
+      return _mm_loadu_si128(reinterpret_cast<const __m128i*>(row + x));
+    };
+    const __m128i r = load(in[0]), g = load(in[1]), b = load(in[2]), a = load(in[3]);
+    const __m128i rgLow = _mm_unpacklo_epi8(r, g), rgHigh = _mm_unpackhi_epi8(r, g);
+    const __m128i baLow = _mm_unpacklo_epi8(b, a), baHigh = _mm_unpackhi_epi8(b, a);
+    auto* to = reinterpret_cast<__m128i*>(out + x * 4);
+    _mm_storeu_si128(to, _mm_unpacklo_epi16(rgLow, baLow));
+    _mm_storeu_si128(to + 1, _mm_unpackhi_epi16(rgLow, baLow));
+    _mm_storeu_si128(to + 2, _mm_unpacklo_epi16(rgHigh, baHigh));
+    _mm_storeu_si128(to + 3, _mm_unpackhi_epi16(rgHigh, baHigh));
+  }
+#endif
+  for (; x < count; ++x) {
+    for (std::size_t c = 0; c < 4; ++c) out[x * 4 + c] = in[c][x];
+  }
+}
+
+// 16-bit samples widened to the texture's full range.
+void Interleave16(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
+  std::size_t x = 0;
+#if defined(__SSE2__)
+  for (; x + 8 <= count; x += 8) {
+    // A saturating doubling is UpTo16.
+    const auto load = [x](const std::uint8_t* row) {
+      const __m128i s = _mm_loadu_si128(reinterpret_cast<const __m128i*>(row + x * 2));
+      return _mm_adds_epu16(s, s);
+    };
+    const __m128i r = load(in[0]), g = load(in[1]), b = load(in[2]), a = load(in[3]);
+    const __m128i rgLow = _mm_unpacklo_epi16(r, g), rgHigh = _mm_unpackhi_epi16(r, g);
+    const __m128i baLow = _mm_unpacklo_epi16(b, a), baHigh = _mm_unpackhi_epi16(b, a);
+    auto* to = reinterpret_cast<__m128i*>(out + x * 8);
+    _mm_storeu_si128(to, _mm_unpacklo_epi32(rgLow, baLow));
+    _mm_storeu_si128(to + 1, _mm_unpackhi_epi32(rgLow, baLow));
+    _mm_storeu_si128(to + 2, _mm_unpacklo_epi32(rgHigh, baHigh));
+    _mm_storeu_si128(to + 3, _mm_unpackhi_epi32(rgHigh, baHigh));
+  }
+#endif
+  for (; x < count; ++x) {
+    for (std::size_t c = 0; c < 4; ++c) Store16(out + x * 8 + c * 2, UpTo16(Load16(in[c] + x * 2)));
+  }
+}
+
+#if defined(ARCHWAY_X86_TEXELS)
+// As Interleave16, each widened sample as the half float of its share of
+// 65535, rounded to nearest even: what the GL stores for a 16-bit integer
+// in a half-float texture, so the texture holds the same bits either way.
+constexpr float kHalfScale = 1.0f / 65535.0f;
+
+// Eight samples from at.
+__attribute__((target("f16c"))) __m128i EightHalves(const std::uint8_t* at) {
+  const __m128i zero = _mm_setzero_si128();
+  const __m128 scale = _mm_set1_ps(kHalfScale);
+  __m128i s = _mm_loadu_si128(reinterpret_cast<const __m128i*>(at));
+  s = _mm_adds_epu16(s, s);
+  const __m128 low = _mm_mul_ps(_mm_cvtepi32_ps(_mm_unpacklo_epi16(s, zero)), scale);
+  const __m128 high = _mm_mul_ps(_mm_cvtepi32_ps(_mm_unpackhi_epi16(s, zero)), scale);
+  return _mm_unpacklo_epi64(_mm_cvtps_ph(low, _MM_FROUND_TO_NEAREST_INT),
+                            _mm_cvtps_ph(high, _MM_FROUND_TO_NEAREST_INT));
+}
+
+__attribute__((target("f16c"))) void InterleaveHalf(const ChannelRows& in, std::size_t count,
+                                                    std::uint8_t* out) {
+  std::size_t x = 0;
+  for (; x + 8 <= count; x += 8) {
+    const __m128i r = EightHalves(in[0] + x * 2), g = EightHalves(in[1] + x * 2);
+    const __m128i b = EightHalves(in[2] + x * 2), a = EightHalves(in[3] + x * 2);
+    const __m128i rgLow = _mm_unpacklo_epi16(r, g), rgHigh = _mm_unpackhi_epi16(r, g);
+    const __m128i baLow = _mm_unpacklo_epi16(b, a), baHigh = _mm_unpackhi_epi16(b, a);
+    auto* to = reinterpret_cast<__m128i*>(out + x * 8);
+    _mm_storeu_si128(to, _mm_unpacklo_epi32(rgLow, baLow));
+    _mm_storeu_si128(to + 1, _mm_unpackhi_epi32(rgLow, baLow));
+    _mm_storeu_si128(to + 2, _mm_unpacklo_epi32(rgHigh, baHigh));
+    _mm_storeu_si128(to + 3, _mm_unpackhi_epi32(rgHigh, baHigh));
+  }
+  for (; x < count; ++x) {
+    for (std::size_t c = 0; c < 4; ++c) {
+      const float value = float(UpTo16(Load16(in[c] + x * 2))) * kHalfScale;
+      Store16(out + x * 8 + c * 2, _cvtss_sh(value, _MM_FROUND_TO_NEAREST_INT));
+    }
+  }
+}
+
+bool CanMakeHalves() {
+  static const bool has = __builtin_cpu_supports("f16c") != 0;
+  return has;
+}
+#else
+void InterleaveHalf(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
+  Interleave16(in, count, out);
+}
+
+bool CanMakeHalves() { return false; }
+#endif
+
+// RGBA read back into four planes' rows, count pixels.
+using PlaneRows = std::array<std::uint8_t*, 4>;
+
+void Deinterleave8(const std::uint8_t* in, std::size_t count, const PlaneRows& out) {
+  std::size_t x = 0;
+#if defined(__SSE2__)
+  for (; x + 16 <= count; x += 16) {
+    // Three rounds of byte interleaving sort 16 pixels' bytes by channel.
+    const auto* from = reinterpret_cast<const __m128i*>(in + x * 4);
+    const __m128i p0 = _mm_loadu_si128(from), p1 = _mm_loadu_si128(from + 1);
+    const __m128i p2 = _mm_loadu_si128(from + 2), p3 = _mm_loadu_si128(from + 3);
+    const __m128i t0 = _mm_unpacklo_epi8(p0, p1), t1 = _mm_unpackhi_epi8(p0, p1);
+    const __m128i t2 = _mm_unpacklo_epi8(p2, p3), t3 = _mm_unpackhi_epi8(p2, p3);
+    const __m128i u0 = _mm_unpacklo_epi8(t0, t1), u1 = _mm_unpackhi_epi8(t0, t1);
+    const __m128i u2 = _mm_unpacklo_epi8(t2, t3), u3 = _mm_unpackhi_epi8(t2, t3);
+    const __m128i rgLow = _mm_unpacklo_epi8(u0, u1), baLow = _mm_unpackhi_epi8(u0, u1);
+    const __m128i rgHigh = _mm_unpacklo_epi8(u2, u3), baHigh = _mm_unpackhi_epi8(u2, u3);
+    const auto store = [x](std::uint8_t* row, __m128i v) {
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x), v);
+    };
+    store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
+    store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
+    store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
+    store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
+  }
+#endif
+  for (; x < count; ++x) {
+    for (std::size_t c = 0; c < 4; ++c) out[c][x] = in[x * 4 + c];
+  }
+}
+
+// 16-bit samples back to the range of the planes.
+void Deinterleave16(const std::uint8_t* in, std::size_t count, const PlaneRows& out) {
+  std::size_t x = 0;
+#if defined(__SSE2__)
+  const __m128i top = _mm_set1_epi16(-1);
+  for (; x + 8 <= count; x += 8) {
+    const auto* from = reinterpret_cast<const __m128i*>(in + x * 8);
+    const __m128i p0 = _mm_loadu_si128(from), p1 = _mm_loadu_si128(from + 1);
+    const __m128i p2 = _mm_loadu_si128(from + 2), p3 = _mm_loadu_si128(from + 3);
+    const __m128i t0 = _mm_unpacklo_epi16(p0, p1), t1 = _mm_unpackhi_epi16(p0, p1);
+    const __m128i t2 = _mm_unpacklo_epi16(p2, p3), t3 = _mm_unpackhi_epi16(p2, p3);
+    const __m128i rgLow = _mm_unpacklo_epi16(t0, t1), baLow = _mm_unpackhi_epi16(t0, t1);
+    const __m128i rgHigh = _mm_unpacklo_epi16(t2, t3), baHigh = _mm_unpackhi_epi16(t2, t3);
+    const auto store = [x, top](std::uint8_t* row, __m128i v) {
+      // DownFrom16: halved, and 65535 to 32768.
+      v = _mm_sub_epi16(_mm_srli_epi16(v, 1), _mm_cmpeq_epi16(v, top));
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x * 2), v);
+    };
+    store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
+    store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
+    store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
+    store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
+  }
+#endif
+  for (; x < count; ++x) {
+    for (std::size_t c = 0; c < 4; ++c)
+      Store16(out[c] + x * 2, DownFrom16(Load16(in + x * 8 + c * 2)));
+  }
+}
+
+// Rows of the source's planes that fill a texture's channels, interleaved
+// into texels.
+class TexelRows {
+ public:
+  TexelRows(std::uint32_t planes, std::uint32_t pass, std::uint32_t depth, bool halves,
+            std::vector<std::uint8_t>& buffer, std::size_t width)
+      : sampleBytes_(depth == 16 ? 2 : 1), halves_(halves), buffer_(buffer) {
+    // Each plane is read once a row, whatever number of channels it fills.
+    const std::array<std::uint32_t, 4> from = TexturePlanes(planes, pass);
+    std::array<std::size_t, 4> slot{};
+    for (std::size_t c = 0; c < 4; ++c) {
+      slot[c] =
+          std::size_t(std::find(read_.begin(), read_.begin() + distinct_, from[c]) - read_.begin());
+      if (slot[c] == distinct_) read_[distinct_++] = from[c];
+    }
+    rowBytes_ = width * sampleBytes_;
+    buffer_.resize(distinct_ * rowBytes_);
+    for (std::size_t c = 0; c < 4; ++c) in_[c] = buffer_.data() + slot[c] * rowBytes_;
+  }
+
+  // width texels (at most the constructor's) from (x, y) of the source.
+  void Read(const Tarsa::CPixmap& source, std::int32_t x, std::int32_t y, std::size_t width,
+            std::uint8_t* out) const {
+    for (std::size_t k = 0; k < distinct_; ++k)
+      source.ReadRow(read_[k], x, y, std::uint32_t(width), buffer_.data() + k * rowBytes_);
+    if (sampleBytes_ == 1) {
+      Interleave8(in_, width, out);
+    } else if (halves_) {
+      InterleaveHalf(in_, width, out);
+    } else {
+      Interleave16(in_, width, out);
+    }
+  }
+
+ private:
+  std::size_t sampleBytes_;
+  bool halves_;
+  std::vector<std::uint8_t>& buffer_;
+  std::array<std::uint32_t, 4> read_{};
+  std::size_t distinct_ = 0;
+  std::size_t rowBytes_ = 0;
+  ChannelRows in_{};
+};
 
 std::int32_t NextPowerOfTwo(std::int32_t n) {
   std::int32_t p = 1;
@@ -47,6 +271,8 @@ PResult::PResult(PImageHub& hub, PFilter& filter)
       pixelLayout_(filter.PixelLayout()),
       planes_(colorPlanes_ + 1) {}
 
+PResult::~PResult() { DeleteTextures(); }
+
 const PResult::CellSet& PResult::TileCells(std::int32_t col, std::int32_t row) const {
   static const CellSet kNone;
   if (col < 0 || row < 0 || col >= tilesAcross_ || row >= tilesDown_) return kNone;
@@ -55,6 +281,8 @@ const PResult::CellSet& PResult::TileCells(std::int32_t col, std::int32_t row) c
 
 void PResult::SetRect(const Tarsa::CRect& rect) {
   currentCol_ = currentRow_ = -1;
+  ahead_.valid = false;
+  DropBlocks();
   if (rect.IsEmpty()) {
     pixels_.reset();
     rect_ = {};
@@ -77,6 +305,9 @@ void PResult::Invalidate(const Tarsa::CRect& area) {
   if (stale.IsEmpty()) return;
   ClearCounts(stale);
   currentCol_ = currentRow_ = -1;
+  // The source may have changed under it.
+  ahead_.valid = false;
+  DropBlocks();
   hub_.ResultChanged(stale);
 }
 
@@ -170,18 +401,14 @@ void PResult::BuildTileIndex() {
   }
 }
 
-bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out) {
-  vertexArray_.clear();
-  texCoordArray_.clear();
-  triangles_.clear();
-  quads_.clear();
+bool PResult::PlaceTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const {
+  place = {};
   const CellSet& cellSet = TileCells(col, row);
   if (cellSet.empty()) return false;
 
   const Solver& solver = filter_.Constraints().GetSolver();
   const std::int32_t n = solver.GridSize();
   const std::int32_t cells = solver.CellCount();
-  const std::vector<float>& positions = solver.Positions();
   const std::vector<float>& tex = solver.TexCoords();
   const double width = resultWidth_, height = resultHeight_;
 
@@ -201,12 +428,11 @@ bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out)
   // edge pixels. Both axes get the border as soon as either needs it. In y
   // the high v is the top: texture rows run the other way.
   std::int32_t extraX = 0, extraY = 0;
-  padLeft_ = padTop_ = 0;
   if (uMin < 0 || uMax > 1 || vMin < 0 || vMax > 1) {
-    padLeft_ = std::int32_t((std::max(0.0, uMin) - uMin) * width) + 1;
-    extraX = padLeft_ + std::int32_t((uMax - std::min(uMax, 1.0)) * width) + 1;
-    padTop_ = std::int32_t((vMax - std::min(vMax, 1.0)) * height) + 1;
-    extraY = padTop_ + std::int32_t((std::max(0.0, vMin) - vMin) * height) + 1;
+    place.padLeft = std::int32_t((std::max(0.0, uMin) - uMin) * width) + 1;
+    extraX = place.padLeft + std::int32_t((uMax - std::min(uMax, 1.0)) * width) + 1;
+    place.padTop = std::int32_t((vMax - std::min(vMax, 1.0)) * height) + 1;
+    extraY = place.padTop + std::int32_t((std::max(0.0, vMin) - vMin) * height) + 1;
   }
   // From cells to vertices.
   i1 = std::min(i1 + 1, cells);
@@ -221,27 +447,51 @@ bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out)
       }
     }
   }
-  if (firstCol == INT32_MAX) {
-    sourceLeft_ = sourceTop_ = sourceWidth_ = sourceHeight_ = 0;
-  } else {
-    sourceLeft_ = std::min(firstCol * kTile, resultWidth_ - 1);
-    sourceTop_ = std::min(firstRow * kTile, resultHeight_ - 1);
-    sourceWidth_ =
-        std::min({129 + (lastCol - firstCol) * kTile, resultWidth_, resultWidth_ - sourceLeft_});
-    sourceHeight_ =
-        std::min({129 + (lastRow - firstRow) * kTile, resultHeight_, resultHeight_ - sourceTop_});
+  if (firstCol != INT32_MAX) {
+    place.sourceLeft = std::min(firstCol * kTile, resultWidth_ - 1);
+    place.sourceTop = std::min(firstRow * kTile, resultHeight_ - 1);
+    place.sourceWidth = std::min(
+        {129 + (lastCol - firstCol) * kTile, resultWidth_, resultWidth_ - place.sourceLeft});
+    place.sourceHeight = std::min(
+        {129 + (lastRow - firstRow) * kTile, resultHeight_, resultHeight_ - place.sourceTop});
   }
-  textureWidth_ = sourceWidth_ + extraX;
-  textureHeight_ = sourceHeight_ + extraY;
-  if (textureWidth_ < 1 || textureHeight_ < 1) return false;
+  place.textureWidth = place.sourceWidth + extraX;
+  place.textureHeight = place.sourceHeight + extraY;
+  if (place.textureWidth < 1 || place.textureHeight < 1) return false;
   if (!hub_.NpotTextures()) {
     // The source moves to the far side of the larger texture.
-    const std::int32_t w = NextPowerOfTwo(textureWidth_), h = NextPowerOfTwo(textureHeight_);
-    padLeft_ += w - textureWidth_;
-    padTop_ += h - textureHeight_;
-    textureWidth_ = w;
-    textureHeight_ = h;
+    const std::int32_t w = NextPowerOfTwo(place.textureWidth);
+    const std::int32_t h = NextPowerOfTwo(place.textureHeight);
+    place.padLeft += w - place.textureWidth;
+    place.padTop += h - place.textureHeight;
+    place.textureWidth = w;
+    place.textureHeight = h;
   }
+  place.firstI = i0;
+  place.firstJ = j0;
+  place.lastI = i1;
+  place.lastJ = j1;
+  const Tarsa::CRect sourceRect = hub_.SourceRect();
+  place.source = Tarsa::CRect{sourceRect.left + place.sourceLeft, sourceRect.top + place.sourceTop,
+                              sourceRect.left + place.sourceLeft + place.sourceWidth,
+                              sourceRect.top + place.sourceTop + place.sourceHeight};
+  return true;
+}
+
+bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out) {
+  vertexArray_.clear();
+  texCoordArray_.clear();
+  triangles_.clear();
+  quads_.clear();
+  if (!PlaceTexture(col, row, placement_)) return false;
+  const TexturePlacement& place = placement_;
+
+  const Solver& solver = filter_.Constraints().GetSolver();
+  const std::int32_t n = solver.GridSize();
+  const std::vector<float>& positions = solver.Positions();
+  const std::vector<float>& tex = solver.TexCoords();
+  const double width = resultWidth_, height = resultHeight_;
+  const std::int32_t i0 = place.firstI, j0 = place.firstJ, i1 = place.lastI, j1 = place.lastJ;
 
   const std::int32_t across = i1 - i0 + 1;
   const std::int32_t down = j1 - j0 + 1;
@@ -255,16 +505,17 @@ bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out)
       const std::size_t to = (std::size_t(j - j0) * std::size_t(across) + std::size_t(i - i0)) * 2;
       vertexArray_[to] = positions[at];
       vertexArray_[to + 1] = positions[at + 1];
-      texCoordArray_[to] = float((tex[at] * width - sourceLeft_ + padLeft_) / textureWidth_);
-      texCoordArray_[to + 1] =
-          float(((1.0 - tex[at + 1]) * height - sourceTop_ + padTop_) / textureHeight_);
+      texCoordArray_[to] =
+          float((tex[at] * width - place.sourceLeft + place.padLeft) / place.textureWidth);
+      texCoordArray_[to + 1] = float(
+          ((1.0 - tex[at + 1]) * height - place.sourceTop + place.padTop) / place.textureHeight);
     }
   }
 
   const PSettings& settings = filter_.Settings();
   const OctaMap& sphere = *solver.GetOctaMap();
   const auto w = std::uint32_t(across);
-  for (const auto& [c, r] : cellSet) {
+  for (const auto& [c, r] : TileCells(col, row)) {
     const auto k = std::uint32_t((r - j0) * across + (c - i0));
     if (settings.meshUseTriangle == 0) {
       quads_.insert(quads_.end(), {k, k + w, k + w + 1, k + 1});
@@ -287,10 +538,7 @@ bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out)
     }
   }
 
-  const Tarsa::CRect sourceRect = hub_.SourceRect();
-  out = Tarsa::CRect{sourceRect.left + sourceLeft_, sourceRect.top + sourceTop_,
-                     sourceRect.left + sourceLeft_ + sourceWidth_,
-                     sourceRect.top + sourceTop_ + sourceHeight_};
+  out = place.source;
   return true;
 }
 
@@ -344,33 +592,207 @@ int PResult::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCoun
   return 1;
 }
 
-void PResult::Pack(const Tarsa::CPixmap& source, const Tarsa::CRect& sourceRect, std::uint32_t pass,
-                   std::vector<std::uint8_t>& texels) const {
-  std::fill(texels.begin(), texels.end(), 0);
-  if (sourceRect.IsEmpty()) return;
-  const std::array<std::uint32_t, 4> from = TexturePlanes(planes_, pass);
-  const auto width = std::uint32_t(sourceRect.Width());
-  const bool wide = depth_ == 16;
-  std::vector<std::uint8_t> row(std::size_t(width) * 2);
-  for (std::int32_t y = sourceRect.top; y < sourceRect.bottom; ++y) {
-    const std::size_t line =
-        std::size_t(padTop_ + (y - sourceRect.top)) * std::size_t(textureWidth_) + padLeft_;
-    for (std::uint32_t channel = 0; channel < 4; ++channel) {
-      source.ReadRow(from[channel], sourceRect.left, y, width, row.data());
-      if (wide) {
-        auto* to = reinterpret_cast<std::uint16_t*>(texels.data()) + line * 4 + channel;
-        const auto* in = reinterpret_cast<const std::uint16_t*>(row.data());
-        for (std::uint32_t x = 0; x < width; ++x) to[std::size_t(x) * 4] = UpTo16(in[x]);
-      } else {
-        std::uint8_t* to = texels.data() + line * 4 + channel;
-        for (std::uint32_t x = 0; x < width; ++x) to[std::size_t(x) * 4] = row[x];
+void PResult::Pack(const Tarsa::CPixmap& source, const TexturePlacement& place, std::uint32_t pass,
+                   std::int32_t x0, std::int32_t y0, std::int32_t x1, std::int32_t y1) {
+  const std::size_t texelBytes = depth_ == 16 ? 8 : 4;
+  const std::size_t lineBytes = std::size_t(x1 - x0) * texelBytes;
+  texels_.resize(lineBytes * std::size_t(y1 - y0));
+
+  // The picture's texels, clipped to the block.
+  const Tarsa::CRect& rect = place.source;
+  const std::int32_t left = std::max(x0, place.padLeft);
+  const std::int32_t right = std::min(x1, place.padLeft + std::int32_t(rect.Width()));
+  const std::int32_t top = std::max(y0, place.padTop);
+  const std::int32_t bottom = std::min(y1, place.padTop + std::int32_t(rect.Height()));
+  const std::size_t width = right > left ? std::size_t(right - left) : 0;
+  const TexelRows rows(planes_, pass, depth_, halfTexels_, sourceRows_, width);
+
+  const std::size_t before = width > 0 ? std::size_t(left - x0) * texelBytes : lineBytes;
+  const std::size_t after = width > 0 ? std::size_t(x1 - right) * texelBytes : 0;
+  for (std::int32_t y = y0; y < y1; ++y) {
+    std::uint8_t* line = texels_.data() + std::size_t(y - y0) * lineBytes;
+    if (y < top || y >= bottom || width == 0) {
+      std::memset(line, 0, lineBytes);
+      continue;
+    }
+    std::memset(line, 0, before);
+    std::memset(line + lineBytes - after, 0, after);
+    rows.Read(source, rect.left + (left - place.padLeft), rect.top + (y - place.padTop), width,
+              line + before);
+  }
+}
+
+void PResult::Fill(const Tarsa::CPixmap& source, const TexturePlacement& place, std::uint32_t pass,
+                   std::uint32_t texture) {
+  const POpenGLTilePass format = TexelFormat(place.textureWidth, place.textureHeight);
+  const std::size_t lineBytes = std::size_t(place.textureWidth) * (depth_ == 16 ? 8 : 4);
+  const auto band = std::int32_t(std::max<std::size_t>(1, kBandBytes / lineBytes));
+  for (std::int32_t y = 0; y < place.textureHeight; y += band) {
+    const std::int32_t end = std::min(place.textureHeight, y + band);
+    Pack(source, place, pass, 0, y, place.textureWidth, end);
+    FillTileTexture(texture, format, 0, y, place.textureWidth, end - y, texels_.data(),
+                    place.textureWidth);
+  }
+}
+
+void PResult::FillMargins(const TexturePlacement& place, std::uint32_t texture) {
+  const POpenGLTilePass format = TexelFormat(place.textureWidth, place.textureHeight);
+  const std::int32_t width = place.textureWidth, height = place.textureHeight;
+  const std::int32_t left = place.padLeft, top = place.padTop;
+  const std::int32_t right = std::min(width, left + std::int32_t(place.source.Width()));
+  const std::int32_t bottom = std::min(height, top + std::int32_t(place.source.Height()));
+  if (left == 0 && top == 0 && right == width && bottom == height) return;
+  const std::size_t lineBytes = std::size_t(width) * (depth_ == 16 ? 8 : 4);
+  const auto band = std::int32_t(std::max<std::size_t>(1, kBandBytes / lineBytes));
+  if (zeros_.size() < lineBytes * std::size_t(band)) zeros_.resize(lineBytes * std::size_t(band));
+  // Rows of zeros from the top and the bottom, then the sides.
+  const auto fill = [&](std::int32_t x0, std::int32_t y0, std::int32_t x1, std::int32_t y1) {
+    for (std::int32_t y = y0; y < y1 && x0 < x1; y += band) {
+      const std::int32_t end = std::min(y1, y + band);
+      FillTileTexture(texture, format, x0, y, x1 - x0, end - y, zeros_.data(), x1 - x0);
+    }
+  };
+  fill(0, 0, width, top);
+  fill(0, bottom, width, height);
+  fill(0, top, left, bottom);
+  fill(right, top, width, bottom);
+}
+
+void PResult::FillPicture(const Tarsa::CPixmap& source, const TexturePlacement& place,
+                          std::uint32_t texture, const std::vector<Tarsa::CRect>& parts,
+                          std::vector<Tarsa::CRect>* late) {
+  const POpenGLTilePass format = TexelFormat(place.textureWidth, place.textureHeight);
+  const std::size_t texelBytes = depth_ == 16 ? 8 : 4;
+  PSource& stage = hub_.Source();
+  for (const Tarsa::CRect& part : parts) {
+    std::int32_t firstCol = 0, firstRow = 0;
+    std::uint32_t columns = 0, rows = 0;
+    if (!stage.CellSpan(part, firstCol, firstRow, columns, rows)) continue;
+    for (std::uint32_t r = 0; r < rows; ++r) {
+      for (std::uint32_t c = 0; c < columns; ++c) {
+        const std::int32_t col = firstCol + std::int32_t(c), row = firstRow + std::int32_t(r);
+        Tarsa::CRect cell;
+        if (!stage.CellRect(col, row, cell)) continue;
+        const Tarsa::CRect area = cell.Intersect(part);
+        if (area.IsEmpty()) continue;
+        if (late != nullptr) {
+          // Reading a tile the stage has not read would see other pixels
+          // than the tile will.
+          std::uint32_t steps = 0;
+          if (!BringUpToDate(stage, cell, false, steps)) {
+            late->push_back(area);
+            continue;
+          }
+        }
+        const TexelBlock& block = Block(source, col, row, cell);
+        const std::uint8_t* texels =
+            block.texels.data() + (std::size_t(area.top - cell.top) * std::size_t(cell.Width()) +
+                                   std::size_t(area.left - cell.left)) *
+                                      texelBytes;
+        FillTileTexture(texture, format, place.padLeft + (area.left - place.source.left),
+                        place.padTop + (area.top - place.source.top), std::int32_t(area.Width()),
+                        std::int32_t(area.Height()), texels, std::int32_t(cell.Width()));
       }
     }
   }
 }
 
-void PResult::Unpack(const std::vector<std::uint8_t>& readback, Tarsa::CMemoryPixmap& dest,
-                     const Tarsa::CRect& tile, std::uint32_t pass) const {
+const PResult::TexelBlock& PResult::Block(const Tarsa::CPixmap& source, std::int32_t col,
+                                          std::int32_t row, const Tarsa::CRect& rect) {
+  const PSource& stage = hub_.Source();
+  if (blockSource_ != &source || blockHalves_ != halfTexels_ ||
+      blockColumns_ != std::int32_t(stage.Columns()) ||
+      blockIndex_.size() != std::size_t(stage.Columns()) * stage.Rows()) {
+    DropBlocks();
+    blockSource_ = &source;
+    blockHalves_ = halfTexels_;
+    blockColumns_ = std::int32_t(stage.Columns());
+    blockIndex_.assign(std::size_t(stage.Columns()) * stage.Rows(), -1);
+  }
+  std::int32_t& index =
+      blockIndex_[std::size_t(row) * std::size_t(blockColumns_) + std::size_t(col)];
+  if (index >= 0) {
+    TexelBlock& block = blocks_[std::size_t(index)];
+    block.lastUse = ++blockUses_;
+    return block;
+  }
+
+  // Source tiles enough for the textures of a few rows of tiles, which
+  // reach some four rows of source tiles, within a few tens of MiB; past
+  // that the one used least recently goes.
+  constexpr std::size_t kBlockRows = 6;
+  constexpr std::size_t kBlockBudget = 48u << 20;
+  const std::size_t texelBytes = depth_ == 16 ? 8 : 4;
+  const std::size_t blockBytes = std::size_t(kTile) * kTile * texelBytes;
+  const std::size_t capacity = std::max<std::size_t>(
+      16, std::min(std::size_t(blockColumns_) * kBlockRows, kBlockBudget / blockBytes));
+  std::size_t slot = blocks_.size();
+  if (slot >= capacity) {
+    slot = std::size_t(std::min_element(blocks_.begin(), blocks_.end(),
+                                        [](const TexelBlock& a, const TexelBlock& b) {
+                                          return a.lastUse < b.lastUse;
+                                        }) -
+                       blocks_.begin());
+    const TexelBlock& old = blocks_[slot];
+    blockIndex_[std::size_t(old.row) * std::size_t(blockColumns_) + std::size_t(old.col)] = -1;
+  } else {
+    blocks_.emplace_back();
+  }
+  TexelBlock& block = blocks_[slot];
+  block.col = col;
+  block.row = row;
+  block.rect = rect;
+  block.lastUse = ++blockUses_;
+  const auto width = std::size_t(rect.Width());
+  block.texels.resize(width * std::size_t(rect.Height()) * texelBytes);
+  const TexelRows rows(planes_, 0, depth_, halfTexels_, sourceRows_, width);
+  for (std::int32_t y = rect.top; y < rect.bottom; ++y) {
+    rows.Read(source, rect.left, y, width,
+              block.texels.data() + std::size_t(y - rect.top) * width * texelBytes);
+  }
+  index = std::int32_t(slot);
+  return block;
+}
+
+void PResult::DropBlocks() {
+  blocks_.clear();
+  blockIndex_.clear();
+  blockSource_ = nullptr;
+}
+
+void PResult::FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
+                        std::uint32_t drawing) {
+  ahead_.valid = false;
+  // Tiles go row by row.
+  std::int32_t nextCol = col + 1, nextRow = row;
+  if (nextCol >= tilesAcross_) nextCol = 0, ++nextRow;
+  if (nextRow >= tilesDown_ || Counter(nextCol, nextRow) >= StepsOf(nextCol, nextRow)) return;
+  TexturePlacement& next = ahead_.placement;
+  if (!PlaceTexture(nextCol, nextRow, next) || next.source.IsEmpty() ||
+      !source.Bounds().Contains(next.source))
+    return;
+  ahead_.col = nextCol;
+  ahead_.row = nextRow;
+  ahead_.texture = TextureOfSize(next.textureWidth, next.textureHeight, drawing);
+  ahead_.late.clear();
+  FillMargins(next, ahead_.texture);
+  FillPicture(source, next, ahead_.texture, {next.source}, &ahead_.late);
+  ahead_.valid = true;
+}
+
+POpenGLTilePass PResult::TexelFormat(std::int32_t width, std::int32_t height) const {
+  POpenGLTilePass format;
+  format.textureWidth = width;
+  format.textureHeight = height;
+  format.textureFormat = hub_.TextureFormat();
+  format.pixelFormat = hub_.PixelFormat();
+  format.pixelType = hub_.PixelType();
+  format.halfTexels = halfTexels_;
+  return format;
+}
+
+void PResult::Unpack(Tarsa::CMemoryPixmap& dest, const Tarsa::CRect& tile,
+                     std::uint32_t pass) const {
   // Target row 0 is the tile's top row: the view puts the plane's top there.
   const Tarsa::CRect area = dest.Bounds();
   const auto width = std::int32_t(area.Width());
@@ -389,17 +811,27 @@ void PResult::Unpack(const std::vector<std::uint8_t>& readback, Tarsa::CMemoryPi
   for (std::int32_t y = area.top; y < area.bottom; ++y) {
     const std::size_t line = std::size_t(y - tile.top) * POpenGLManager::kSurfaceSize +
                              std::size_t(area.left - tile.left);
+    if (count == 4) {
+      // Every channel to its own plane.
+      const PlaneRows to{dest.Address(0, area.left, y), dest.Address(1, area.left, y),
+                         dest.Address(2, area.left, y), dest.Address(3, area.left, y)};
+      if (wide) {
+        Deinterleave16(readback_.data() + line * 8, std::size_t(width), to);
+      } else {
+        Deinterleave8(readback_.data() + line * 4, std::size_t(width), to);
+      }
+      continue;
+    }
     for (std::size_t k = 0; k < count; ++k) {
       const auto [plane, channel] = back[k];
       std::uint8_t* to = dest.Address(plane, area.left, y);
       if (wide) {
-        const auto* in = reinterpret_cast<const std::uint16_t*>(readback.data()) + line * 4;
-        auto* out = reinterpret_cast<std::uint16_t*>(to);
+        const std::uint8_t* in = readback_.data() + line * 8 + channel * 2;
         for (std::int32_t x = 0; x < width; ++x)
-          out[x] = DownFrom16(in[std::size_t(x) * 4 + channel]);
+          Store16(to + std::size_t(x) * 2, DownFrom16(Load16(in + std::size_t(x) * 8)));
       } else {
-        const std::uint8_t* in = readback.data() + line * 4;
-        for (std::int32_t x = 0; x < width; ++x) to[x] = in[std::size_t(x) * 4 + channel];
+        const std::uint8_t* in = readback_.data() + line * 4 + channel;
+        for (std::int32_t x = 0; x < width; ++x) to[x] = in[std::size_t(x) * 4];
       }
     }
   }
@@ -408,6 +840,8 @@ void PResult::Unpack(const std::vector<std::uint8_t>& readback, Tarsa::CMemoryPi
 void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& source,
                          const Tarsa::CRect& sourceRect, std::int32_t col, std::int32_t row) {
   POpenGLManager& gl = hub_.GLManager();
+  TexturePlacement place = placement_;
+  place.source = sourceRect;
   const double s = std::max(meshScaleX_, meshScaleY_);
   const double fx = double(kTile) / resultWidth_;
   const double fy = double(kTile) / resultHeight_;
@@ -424,12 +858,12 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   pass.shiftY = float(row * meshScaleY_ * fy - meshOriginY_);
   pass.drawGeometry = currentHasCells_ && source.Bounds().Contains(sourceRect);
   pass.textured = filter_.Settings().textureRendering != 0;
-  pass.textureWidth = textureWidth_;
-  pass.textureHeight = textureHeight_;
-  pass.pictureTexels[0] = float(padLeft_);
-  pass.pictureTexels[1] = float(padTop_);
-  pass.pictureTexels[2] = float(padLeft_ + sourceWidth_ - 1);
-  pass.pictureTexels[3] = float(padTop_ + sourceHeight_ - 1);
+  pass.textureWidth = place.textureWidth;
+  pass.textureHeight = place.textureHeight;
+  pass.pictureTexels[0] = float(place.padLeft);
+  pass.pictureTexels[1] = float(place.padTop);
+  pass.pictureTexels[2] = float(place.padLeft + place.sourceWidth - 1);
+  pass.pictureTexels[3] = float(place.padTop + place.sourceHeight - 1);
   pass.textureFormat = hub_.TextureFormat();
   pass.pixelFormat = hub_.PixelFormat();
   pass.pixelType = hub_.PixelType();
@@ -441,27 +875,88 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   pass.quadIndices = quads_.size();
 
   const std::size_t sampleBytes = depth_ == 16 ? 2 : 1;
-  std::vector<std::uint8_t> texels(std::size_t(std::max(textureWidth_, 0)) *
-                                   std::size_t(std::max(textureHeight_, 0)) * 4 * sampleBytes);
-  std::vector<std::uint8_t> readback(std::size_t(POpenGLManager::kSurfaceSize) *
-                                     POpenGLManager::kSurfaceSize * 4 * sampleBytes);
-  pass.texels = texels.data();
-  pass.readback = readback.data();
+  readback_.resize(std::size_t(POpenGLManager::kSurfaceSize) * POpenGLManager::kSurfaceSize * 4 *
+                   sampleBytes);
+  pass.readback = readback_.data();
   const Tarsa::CRect tile = TileRect({rect_.left, rect_.top}, col, row);
 
   const std::uint32_t passes = planes_ < 5 ? 1 : 2;
+  const bool textured = pass.drawGeometry && pass.textured;
+  // With one pass and the stage's own source, textures come from the kept
+  // source tiles, and the next tile's is filled while this one draws.
+  const bool fromBlocks = textured && passes == 1 && &source == hub_.Source().Pixels();
   gl.MakeCurrent();
   try {
+    halfTexels_ = depth_ == 16 && pass.textureFormat == PImageHub::kGLRGBA16F &&
+                  pass.pixelType == PImageHub::kGLUnsignedShort && CanMakeHalves() &&
+                  TakesHalfFloatTexels();
+    pass.halfTexels = halfTexels_;
+    const bool ready = fromBlocks && ahead_.valid && ahead_.col == col && ahead_.row == row &&
+                       ahead_.placement == place && blockSource_ == &source &&
+                       blockHalves_ == halfTexels_;
+    ahead_.valid = false;
     for (std::uint32_t p = 0; p < passes; ++p) {
-      if (pass.drawGeometry) Pack(source, sourceRect, p, texels);
-      RenderTilePass(gl, pass);
-      Unpack(readback, dest, tile, p);
+      if (ready) {
+        // What was left out has been read by now.
+        pass.texture = ahead_.texture;
+        FillPicture(source, place, pass.texture, ahead_.late, nullptr);
+      } else if (fromBlocks) {
+        pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
+        FillMargins(place, pass.texture);
+        FillPicture(source, place, pass.texture, {place.source}, nullptr);
+      } else if (textured) {
+        pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
+        Fill(source, place, p, pass.texture);
+      }
+      const std::uint32_t made = DrawTilePass(gl, pass);
+      if (fromBlocks) FillAhead(source, col, row, pass.texture);
+      ReadTilePass(pass, made);
+      Unpack(dest, tile, p);
     }
+    // After the last tile the kept source tiles have served their turn.
+    if (col + 1 >= tilesAcross_ && row + 1 >= tilesDown_) DropBlocks();
   } catch (...) {
+    ahead_.valid = false;
     gl.ReleaseCurrent();
     throw;
   }
   gl.ReleaseCurrent();
+}
+
+std::uint32_t PResult::TextureOfSize(std::int32_t width, std::int32_t height, std::uint32_t busy) {
+  KeptTexture* pick = nullptr;
+  for (KeptTexture& kept : textures_) {
+    if (kept.name != 0 && kept.name != busy && kept.width == width && kept.height == height) {
+      pick = &kept;
+      break;
+    }
+  }
+  if (pick == nullptr) {
+    for (KeptTexture& kept : textures_) {
+      const bool free = kept.name == 0 || kept.name != busy;
+      if (free && (pick == nullptr || kept.lastUse < pick->lastUse)) pick = &kept;
+    }
+    DefineTileTexture(hub_.GLManager(), pick->name, TexelFormat(width, height));
+    pick->width = width;
+    pick->height = height;
+  }
+  pick->lastUse = ++textureUses_;
+  return pick->name;
+}
+
+void PResult::DeleteTextures() {
+  ahead_.valid = false;
+  if (std::all_of(textures_.begin(), textures_.end(),
+                  [](const KeptTexture& kept) { return kept.name == 0; }))
+    return;
+  // The names belong to the manager's context; without it they went with it.
+  POpenGLManager& gl = hub_.GLManager();
+  gl.MakeCurrent();
+  if (gl.MadeCurrent()) {
+    for (KeptTexture& kept : textures_) DeleteTileTexture(kept.name);
+  }
+  gl.ReleaseCurrent();
+  textures_ = {};
 }
 
 }  // namespace Project

@@ -1,5 +1,8 @@
 #include "gpu/POpenGLTile.h"
 
+#include <cstdlib>
+#include <cstring>
+
 #define EGL_NO_X11
 #include <GL/gl.h>
 
@@ -7,7 +10,28 @@
 
 namespace Project {
 
+namespace {
+
+GLenum TexelType(const POpenGLTilePass& pass) {
+  return pass.halfTexels ? GL_HALF_FLOAT : pass.pixelType;
+}
+
+// Sampling state lives in the texture object: set once when it is defined.
+void SetSampling(POpenGLManager& manager) {
+  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_S, GL_CLAMP);
+  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_T, GL_CLAMP);
+  const GLint filter = manager.ShaderReady() ? GL_NEAREST : GL_LINEAR;
+  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MIN_FILTER, filter);
+  glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MAG_FILTER, filter);
+}
+
+}  // namespace
+
 void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
+  ReadTilePass(pass, DrawTilePass(manager, pass));
+}
+
+std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
   constexpr int kSize = POpenGLManager::kSurfaceSize;
   glViewport(0, 0, kSize, kSize);
   glMatrixMode(GL_PROJECTION);
@@ -19,7 +43,7 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
   manager.UseShader();
   glClear(GL_COLOR_BUFFER_BIT | GL_DEPTH_BUFFER_BIT);
 
-  GLuint texture = 0;
+  GLuint made = 0;
   if (pass.drawGeometry) {
     glMatrixMode(GL_MODELVIEW);
     glLoadIdentity();
@@ -28,20 +52,21 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
 
     if (pass.textured) {
       glEnable(GL_TEXTURE_2D);
-      glPixelStorei(GL_UNPACK_ALIGNMENT, 1);
-      glGenTextures(1, &texture);
-      glBindTexture(GL_TEXTURE_2D, texture);
+      if (pass.texture != 0) {
+        glBindTexture(GL_TEXTURE_2D, pass.texture);
+      } else {
+        glGenTextures(1, &made);
+        glBindTexture(GL_TEXTURE_2D, made);
+        SetSampling(manager);
+        glPixelStorei(GL_UNPACK_ALIGNMENT, 1);
+        glPixelStorei(GL_UNPACK_ROW_LENGTH, 0);
+        glTexImage2D(GL_TEXTURE_2D, 0, GLint(pass.textureFormat), pass.textureWidth,
+                     pass.textureHeight, 0, pass.pixelFormat, TexelType(pass), pass.texels);
+      }
       glTexEnvi(GL_TEXTURE_ENV, GL_TEXTURE_ENV_MODE, GL_REPLACE);
-      glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_S, GL_CLAMP);
-      glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_WRAP_T, GL_CLAMP);
-      const GLint filter = manager.ShaderReady() ? GL_NEAREST : GL_LINEAR;
-      glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MIN_FILTER, filter);
-      glTexParameteri(GL_TEXTURE_2D, GL_TEXTURE_MAG_FILTER, filter);
       manager.SetShaderSizes(1.0f / float(pass.textureWidth), 1.0f / float(pass.textureHeight),
                              float(pass.textureWidth), float(pass.textureHeight),
                              pass.pictureTexels);
-      glTexImage2D(GL_TEXTURE_2D, 0, GLint(pass.textureFormat), pass.textureWidth,
-                   pass.textureHeight, 0, pass.pixelFormat, pass.pixelType, pass.texels);
     } else {
       glDisable(GL_TEXTURE_2D);
       glColor4f(1, 0, 0, 1);
@@ -66,14 +91,60 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
     glDisableClientState(GL_VERTEX_ARRAY);
   }
   glFlush();
+  return made;
+}
 
+void ReadTilePass(const POpenGLTilePass& pass, std::uint32_t madeTexture) {
+  constexpr int kSize = POpenGLManager::kSurfaceSize;
   glPixelStorei(GL_PACK_ALIGNMENT, 1);
   glReadPixels(0, 0, kSize, kSize, pass.pixelFormat, pass.pixelType, pass.readback);
-  if (texture != 0) {
-    glBindTexture(GL_TEXTURE_2D, 0);
+  glBindTexture(GL_TEXTURE_2D, 0);
+  if (madeTexture != 0) {
+    const GLuint texture = madeTexture;
     glDeleteTextures(1, &texture);
   }
   glDisable(GL_TEXTURE_2D);
+}
+
+void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
+                       const POpenGLTilePass& pass) {
+  if (texture == 0) {
+    GLuint name = 0;
+    glGenTextures(1, &name);
+    glBindTexture(GL_TEXTURE_2D, name);
+    SetSampling(manager);
+    texture = name;
+  } else {
+    glBindTexture(GL_TEXTURE_2D, texture);
+  }
+  glTexImage2D(GL_TEXTURE_2D, 0, GLint(pass.textureFormat), pass.textureWidth, pass.textureHeight,
+               0, pass.pixelFormat, TexelType(pass), nullptr);
+  glBindTexture(GL_TEXTURE_2D, 0);
+}
+
+void FillTileTexture(std::uint32_t texture, const POpenGLTilePass& pass, int x, int y, int width,
+                     int height, const void* texels, int rowLength) {
+  glBindTexture(GL_TEXTURE_2D, texture);
+  glPixelStorei(GL_UNPACK_ALIGNMENT, 1);
+  glPixelStorei(GL_UNPACK_ROW_LENGTH, rowLength);
+  glTexSubImage2D(GL_TEXTURE_2D, 0, x, y, width, height, pass.pixelFormat, TexelType(pass), texels);
+  glPixelStorei(GL_UNPACK_ROW_LENGTH, 0);
+  glBindTexture(GL_TEXTURE_2D, 0);
+}
+
+void DeleteTileTexture(std::uint32_t& texture) {
+  if (texture == 0) return;
+  const GLuint name = texture;
+  glDeleteTextures(1, &name);
+  texture = 0;
+}
+
+bool TakesHalfFloatTexels() {
+  // A core type from 3.0, an extension before.
+  const auto* version = reinterpret_cast<const char*>(glGetString(GL_VERSION));
+  if (version != nullptr && std::atoi(version) >= 3) return true;
+  const auto* extensions = reinterpret_cast<const char*>(glGetString(GL_EXTENSIONS));
+  return extensions != nullptr && std::strstr(extensions, "GL_ARB_half_float_pixel") != nullptr;
 }
 
 }  // namespace Project

@@ -30,6 +30,10 @@ struct POpenGLTilePass {
 
   // Four samples per texel, rows from t = 0, of pixelType.
   const void* texels = nullptr;
+  // A texture filled already (DefineTileTexture, FillTileTexture): the pass
+  // draws from it and texels is not read. 0: a texture is made from texels
+  // for the pass.
+  std::uint32_t texture = 0;
   int textureWidth = 0;
   int textureHeight = 0;
   // The texels that hold the picture's pixels, first and last, x then y:
@@ -38,6 +42,9 @@ struct POpenGLTilePass {
   std::uint32_t textureFormat = 0;
   std::uint32_t pixelFormat = 0;
   std::uint32_t pixelType = 0;
+  // The texels are half floats, not pixelType: for a half-float texture,
+  // whose texels then go in unconverted. The read back stays pixelType.
+  bool halfTexels = false;
 
   // Two floats per vertex each.
   const float* vertices = nullptr;
@@ -56,5 +63,27 @@ struct POpenGLTilePass {
 // texture is sampled texel by texel and the shader interpolates; without it,
 // bilinear filtering does.
 void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass);
+
+// RenderTilePass in two halves, so that the CPU can work while the GL draws:
+// DrawTilePass clears, draws and sends the drawing off; ReadTilePass waits
+// for it and reads the target back. DrawTilePass answers the texture it made
+// from pass.texels (0 for none), which ReadTilePass deletes.
+std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass);
+void ReadTilePass(const POpenGLTilePass& pass, std::uint32_t madeTexture);
+
+// A texture kept by the caller across passes, in the manager's context:
+// DefineTileTexture makes it when texture is 0 and gives it the pass's size,
+// formats and sampling, its texels undefined until filled. FillTileTexture
+// writes width x height texels at (x, y) from texels, whose rows lie
+// rowLength texels apart, of the pass's type.
+void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
+                       const POpenGLTilePass& pass);
+void FillTileTexture(std::uint32_t texture, const POpenGLTilePass& pass, int x, int y, int width,
+                     int height, const void* texels, int rowLength);
+// Deletes texture, when not 0, and sets it to 0.
+void DeleteTileTexture(std::uint32_t& texture);
+
+// Whether the current context takes half floats as texels.
+bool TakesHalfFloatTexels();
 
 }  // namespace Project
