@@ -282,6 +282,7 @@ const PResult::CellSet& PResult::TileCells(std::int32_t col, std::int32_t row) c
 void PResult::SetRect(const Tarsa::CRect& rect) {
   currentCol_ = currentRow_ = -1;
   ahead_.valid = false;
+  inflight_.valid = false;
   DropBlocks();
   if (rect.IsEmpty()) {
     pixels_.reset();
@@ -307,6 +308,7 @@ void PResult::Invalidate(const Tarsa::CRect& area) {
   currentCol_ = currentRow_ = -1;
   // The source may have changed under it.
   ahead_.valid = false;
+  inflight_.valid = false;
   DropBlocks();
   hub_.ResultChanged(stale);
 }
@@ -585,6 +587,7 @@ int PResult::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCoun
       }
     }
     RenderTile(dest, *from, currentSourceRect_, col, row);
+    DrawAhead(col, row, stepCount);
   }
   pixels_->CopyFrom(dest, tile);
   SetCount(col, row, StepsOf(col, row));
@@ -837,11 +840,9 @@ void PResult::Unpack(Tarsa::CMemoryPixmap& dest, const Tarsa::CRect& tile,
   }
 }
 
-void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& source,
-                         const Tarsa::CRect& sourceRect, std::int32_t col, std::int32_t row) {
-  POpenGLManager& gl = hub_.GLManager();
-  TexturePlacement place = placement_;
-  place.source = sourceRect;
+POpenGLTilePass PResult::TilePass(const Tarsa::CPixmap& source, const Tarsa::CRect& sourceRect,
+                                  std::int32_t col, std::int32_t row) {
+  const TexturePlacement& place = placement_;
   const double s = std::max(meshScaleX_, meshScaleY_);
   const double fx = double(kTile) / resultWidth_;
   const double fy = double(kTile) / resultHeight_;
@@ -873,11 +874,19 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   pass.triangleIndices = triangles_.size();
   pass.quads = quads_.data();
   pass.quadIndices = quads_.size();
-
   const std::size_t sampleBytes = depth_ == 16 ? 2 : 1;
   readback_.resize(std::size_t(POpenGLManager::kSurfaceSize) * POpenGLManager::kSurfaceSize * 4 *
                    sampleBytes);
   pass.readback = readback_.data();
+  return pass;
+}
+
+void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& source,
+                         const Tarsa::CRect& sourceRect, std::int32_t col, std::int32_t row) {
+  POpenGLManager& gl = hub_.GLManager();
+  placement_.source = sourceRect;
+  const TexturePlacement& place = placement_;
+  POpenGLTilePass pass = TilePass(source, sourceRect, col, row);
   const Tarsa::CRect tile = TileRect({rect_.left, rect_.top}, col, row);
 
   const std::uint32_t passes = planes_ < 5 ? 1 : 2;
@@ -885,6 +894,9 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   // With one pass and the stage's own source, textures come from the kept
   // source tiles, and the next tile's is filled while this one draws.
   const bool fromBlocks = textured && passes == 1 && &source == hub_.Source().Pixels();
+  const bool drawn = inflight_.valid && inflight_.col == col && inflight_.row == row &&
+                     inflight_.placement == place && inflight_.draw == gl.DrawCount() && fromBlocks;
+  inflight_.valid = false;
   gl.MakeCurrent();
   try {
     halfTexels_ = depth_ == 16 && pass.textureFormat == PImageHub::kGLRGBA16F &&
@@ -894,22 +906,25 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
     const bool ready = fromBlocks && ahead_.valid && ahead_.col == col && ahead_.row == row &&
                        ahead_.placement == place && blockSource_ == &source &&
                        blockHalves_ == halfTexels_;
-    ahead_.valid = false;
+    if (!drawn) ahead_.valid = false;
     for (std::uint32_t p = 0; p < passes; ++p) {
-      if (ready) {
-        // What was left out has been read by now.
-        pass.texture = ahead_.texture;
-        FillPicture(source, place, pass.texture, ahead_.late, nullptr);
-      } else if (fromBlocks) {
-        pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
-        FillMargins(place, pass.texture);
-        FillPicture(source, place, pass.texture, {place.source}, nullptr);
-      } else if (textured) {
-        pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
-        Fill(source, place, p, pass.texture);
+      std::uint32_t made = 0;
+      if (!drawn) {
+        if (ready) {
+          // What was left out has been read by now.
+          pass.texture = ahead_.texture;
+          FillPicture(source, place, pass.texture, ahead_.late, nullptr);
+        } else if (fromBlocks) {
+          pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
+          FillMargins(place, pass.texture);
+          FillPicture(source, place, pass.texture, {place.source}, nullptr);
+        } else if (textured) {
+          pass.texture = TextureOfSize(place.textureWidth, place.textureHeight, 0);
+          Fill(source, place, p, pass.texture);
+        }
+        made = DrawTilePass(gl, pass);
+        if (fromBlocks) FillAhead(source, col, row, pass.texture);
       }
-      const std::uint32_t made = DrawTilePass(gl, pass);
-      if (fromBlocks) FillAhead(source, col, row, pass.texture);
       ReadTilePass(pass, made);
       Unpack(dest, tile, p);
     }
@@ -917,6 +932,48 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
     if (col + 1 >= tilesAcross_ && row + 1 >= tilesDown_) DropBlocks();
   } catch (...) {
     ahead_.valid = false;
+    gl.ReleaseCurrent();
+    throw;
+  }
+  gl.ReleaseCurrent();
+}
+
+void PResult::DrawAhead(std::int32_t col, std::int32_t row, std::uint32_t& stepCount) {
+  inflight_.valid = false;
+  if (!ahead_.valid || planes_ >= 5 || !hub_.GLUsable() ||
+      filter_.Settings().projectionModel == PSettings::kModelFullSpherical)
+    return;
+  // Only the tile that comes next, and only from the texture ahead.
+  std::int32_t nextCol = col + 1, nextRow = row;
+  if (nextCol >= tilesAcross_) nextCol = 0, ++nextRow;
+  if (ahead_.col != nextCol || ahead_.row != nextRow) return;
+  PSource& source = hub_.Source();
+  const Tarsa::CPixmap* pixels = source.Pixels();
+  if (pixels == nullptr || blockSource_ != pixels || blockHalves_ != halfTexels_) return;
+  if (!BringUpToDate(source, ahead_.placement.source, true, stepCount)) return;
+
+  Tarsa::CRect sourceRect;
+  currentHasCells_ = PrepareTile(nextCol, nextRow, sourceRect);
+  currentSourceRect_ = sourceRect;
+  currentCol_ = nextCol;
+  currentRow_ = nextRow;
+  if (!currentHasCells_ || !(placement_ == ahead_.placement)) return;
+  POpenGLTilePass pass = TilePass(*pixels, sourceRect, nextCol, nextRow);
+  if (!pass.drawGeometry || !pass.textured) return;
+  pass.halfTexels = halfTexels_;
+
+  POpenGLManager& gl = hub_.GLManager();
+  gl.MakeCurrent();
+  try {
+    pass.texture = ahead_.texture;
+    FillPicture(*pixels, placement_, pass.texture, ahead_.late, nullptr);
+    ahead_.valid = false;
+    DrawTilePass(gl, pass);
+    inflight_ = {true, nextCol, nextRow, placement_, gl.DrawCount()};
+    FillAhead(*pixels, nextCol, nextRow, pass.texture);
+  } catch (...) {
+    ahead_.valid = false;
+    inflight_.valid = false;
     gl.ReleaseCurrent();
     throw;
   }
@@ -946,6 +1003,7 @@ std::uint32_t PResult::TextureOfSize(std::int32_t width, std::int32_t height, st
 
 void PResult::DeleteTextures() {
   ahead_.valid = false;
+  inflight_.valid = false;
   if (std::all_of(textures_.begin(), textures_.end(),
                   [](const KeptTexture& kept) { return kept.name == 0; }))
     return;

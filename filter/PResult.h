@@ -100,6 +100,16 @@ class PResult : public Tarsa::CPixProcess {
     std::vector<Tarsa::CRect> late;
   };
 
+  // The tile the GL was given to draw before it was asked for: drawn while
+  // the tile before it went on to the host, read back when it is asked for.
+  struct TileInFlight {
+    bool valid = false;
+    std::int32_t col = 0;
+    std::int32_t row = 0;
+    TexturePlacement placement;
+    std::uint64_t draw = 0;  // the manager's draw count after it
+  };
+
   // A texture kept from tile to tile: the GL makes a texture's storage at
   // some cost, and most tiles share a few sizes.
   struct KeptTexture {
@@ -150,6 +160,15 @@ class PResult : public Tarsa::CPixProcess {
   // current.
   void FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
                  std::uint32_t drawing);
+  // Gives the GL the tile expected after (col, row) to draw, from the
+  // texture filled ahead, its source read now where it was not: the GL
+  // draws while the caller passes (col, row) on. Nothing when the next tile
+  // is not that simple (two passes, a cut source, no texture ahead).
+  void DrawAhead(std::int32_t col, std::int32_t row, std::uint32_t& stepCount);
+  // The pass that draws the prepared tile (col, row) from source over
+  // sourceRect, up to its texture.
+  POpenGLTilePass TilePass(const Tarsa::CPixmap& source, const Tarsa::CRect& sourceRect,
+                           std::int32_t col, std::int32_t row);
   // The texel format of the textures, for transfers.
   POpenGLTilePass TexelFormat(std::int32_t width, std::int32_t height) const;
   // A kept texture of the size, other than busy; given that size when none
@@ -201,6 +220,7 @@ class PResult : public Tarsa::CPixProcess {
   std::array<KeptTexture, 4> textures_{};
   std::uint64_t textureUses_ = 0;
   TextureAhead ahead_;
+  TileInFlight inflight_;
   std::vector<TexelBlock> blocks_;
   // Per cell of the source stage, row by row: its index in blocks_, or -1.
   std::vector<std::int32_t> blockIndex_;

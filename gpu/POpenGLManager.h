@@ -89,6 +89,10 @@ class POpenGLManager {
   int WindowPathStage() const { return windowPathStage_; }
   bool MadeCurrent() const { return madeCurrent_; }
   bool ShaderReady() const { return shaderReady_; }
+  // Draws into the surface so far: a tile drawn ahead is still there to be
+  // read back only while no other draw has followed it.
+  std::uint64_t DrawCount() const { return drawCount_; }
+  void CountDraw() { ++drawCount_; }
 
   // With the shader ready: use it, and set its uniforms "texelSize",
   // "textureSize" and "pictureTexels" (the first and last texel, x and y,
@@ -130,6 +134,7 @@ class POpenGLManager {
   std::unique_ptr<Functions> functions_;
   std::unique_ptr<POpenGLImage> fallbackImage_;
   bool madeCurrent_ = false;
+  std::uint64_t drawCount_ = 0;
   int failureStage_ = 0;
   int windowPathStage_ = 0;
 

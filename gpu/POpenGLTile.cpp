@@ -33,6 +33,7 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
 
 std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
   constexpr int kSize = POpenGLManager::kSurfaceSize;
+  manager.CountDraw();
   glViewport(0, 0, kSize, kSize);
   glMatrixMode(GL_PROJECTION);
   glLoadIdentity();

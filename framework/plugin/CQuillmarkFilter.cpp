@@ -1,6 +1,7 @@
 #include "framework/plugin/CQuillmarkFilter.h"
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 #include <exception>
 #include <memory>
@@ -10,6 +11,7 @@
 #include "framework/memory/CMemoryService.h"
 #include "framework/memory/CVirtualAllocator.h"
 #include "framework/native/NativeSystem.h"
+#include "framework/pixels/SampleInterleave.h"
 #include "framework/plugin/CBufferSuiteAllocator.h"
 #include "framework/plugin/CQuillmarkError.h"
 #include "framework/strings/Unicode.h"
@@ -19,6 +21,9 @@ namespace Tarsa {
 namespace {
 
 CQuillmarkFilter* gFilter = nullptr;
+
+// The most planes a pixel takes the unrolled road back to the host with.
+constexpr std::uint32_t kMaxPlanes = 8;
 
 constexpr const char* kNotEnoughMemoryText =
     "$$$/Tarsa/QuillmarkPlugin/Error/NotEnoughMemory=This plugin requires more memory than the "
@@ -612,16 +617,28 @@ void CQuillmarkFilter::WritePixmap(const CMemoryPixmap& pixmap, const CRect& rec
     if (code != 0) throw CSystemError(code);
 
     if (auto* out = static_cast<std::uint8_t*>(record->outData)) {
-      const std::size_t pixelStride = std::size_t(planeCount) * bytes;
-      for (std::uint32_t k = 0; k < planes; ++k) {
-        for (std::int32_t y = area.top; y < area.bottom; ++y) {
-          std::uint8_t* to = out + std::ptrdiff_t(y - area.top) * record->outRowBytes + k * bytes;
-          const std::uint8_t* from = pixmap.Address(k, area.left, y);
-          for (std::int64_t x = 0; x < area.Width(); ++x) {
-            std::memcpy(to, from, bytes);
-            to += pixelStride;
-            from += bytes;
+      const auto width = std::size_t(area.Width());
+      const auto stride = std::size_t(planeCount);
+      for (std::int32_t y = area.top; y < area.bottom; ++y) {
+        std::uint8_t* to = out + std::ptrdiff_t(y - area.top) * record->outRowBytes;
+        if (planes <= kMaxPlanes && (bytes == 1 || bytes == 2)) {
+          std::array<const std::uint8_t*, kMaxPlanes> from{};
+          for (std::uint32_t k = 0; k < planes; ++k) from[k] = pixmap.Address(k, area.left, y);
+          if (bytes == 2) {
+            std::array<const std::uint16_t*, kMaxPlanes> wide{};
+            for (std::uint32_t k = 0; k < planes; ++k)
+              wide[k] = reinterpret_cast<const std::uint16_t*>(from[k]);
+            PlanesToPixels<std::uint16_t>({wide.data(), planes}, width, stride,
+                                          reinterpret_cast<std::uint16_t*>(to));
+          } else {
+            PlanesToPixels<std::uint8_t>({from.data(), planes}, width, stride, to);
           }
+          continue;
+        }
+        for (std::uint32_t k = 0; k < planes; ++k) {
+          const std::uint8_t* from = pixmap.Address(k, area.left, y);
+          for (std::size_t x = 0; x < width; ++x)
+            std::memcpy(to + (x * stride + k) * bytes, from + x * bytes, bytes);
         }
       }
     }

@@ -5,7 +5,9 @@
 #include <limits>
 #include <new>
 #include <utility>
+#include <vector>
 
+#include "framework/pixels/SampleInterleave.h"
 #include "host/plugin/HostCodes.h"
 
 namespace Host {
@@ -30,28 +32,29 @@ bool BlockExchange::HasRequest() const {
 
 template <typename Sample>
 void BlockExchange::Transfer(const Block& block, bool toDocument) {
-  const int planes = block.lastPlane - block.firstPlane + 1;
+  const auto planes = static_cast<size_t>(block.lastPlane - block.firstPlane + 1);
   const size_t width = static_cast<size_t>(document_.Width());
-  const int32_t columns = block.rect.right - block.rect.left;
+  const auto columns = static_cast<size_t>(block.rect.right - block.rect.left);
   const Sample max = static_cast<Sample>(document_.MaxSample());
-  for (int p = 0; p < planes; ++p) {
-    Sample* plane;
+  std::vector<Sample*> planeStarts(planes);
+  for (size_t p = 0; p < planes; ++p) {
     if constexpr (sizeof(Sample) == 1) {
-      plane = document_.Plane8(block.firstPlane + p).data();
+      planeStarts[p] = document_.Plane8(block.firstPlane + static_cast<int>(p)).data();
     } else {
-      plane = document_.Plane16(block.firstPlane + p).data();
+      planeStarts[p] = document_.Plane16(block.firstPlane + static_cast<int>(p)).data();
     }
-    for (int32_t y = block.rect.top; y < block.rect.bottom; ++y) {
-      Sample* row = plane + static_cast<size_t>(y) * width + static_cast<size_t>(block.rect.left);
-      auto* cells =
-          reinterpret_cast<Sample*>(block.bytes.get() +
-                                    static_cast<size_t>(y - block.rect.top) * block.rowBytes) +
-          p;
-      if (toDocument) {
-        for (int32_t x = 0; x < columns; ++x) row[x] = std::min(cells[x * planes], max);
-      } else {
-        for (int32_t x = 0; x < columns; ++x) cells[x * planes] = row[x];
-      }
+  }
+  std::vector<Sample*> rows(planes);
+  std::vector<const Sample*> reads(planes);
+  for (int32_t y = block.rect.top; y < block.rect.bottom; ++y) {
+    const size_t first = static_cast<size_t>(y) * width + static_cast<size_t>(block.rect.left);
+    for (size_t p = 0; p < planes; ++p) reads[p] = rows[p] = planeStarts[p] + first;
+    auto* cells = reinterpret_cast<Sample*>(
+        block.bytes.get() + static_cast<size_t>(y - block.rect.top) * block.rowBytes);
+    if (toDocument) {
+      Tarsa::PixelsToPlanes<Sample>(cells, planes, columns, rows, max);
+    } else {
+      Tarsa::PlanesToPixels<Sample>(reads, columns, planes, cells);
     }
   }
 }

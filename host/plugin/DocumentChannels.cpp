@@ -53,7 +53,14 @@ Tarsa::HostError CopyOut(const Port* port, const Tarsa::HostRect32& area,
   for (int32_t y = top; y < bottom; ++y) {
     uint8_t* out = base + (y - area.top) * rowStep + (left - area.left) * colStep;
     const size_t first = static_cast<size_t>(y) * width + static_cast<size_t>(left);
-    if (bytes == 1) {
+    if (colStep == bytes) {
+      // Samples side by side: the row goes as it is.
+      const uint8_t* in =
+          bytes == 1
+              ? document.Plane8(port->plane).data() + first
+              : reinterpret_cast<const uint8_t*>(document.Plane16(port->plane).data() + first);
+      std::memcpy(out, in, static_cast<size_t>(right - left) * static_cast<size_t>(bytes));
+    } else if (bytes == 1) {
       const uint8_t* in = document.Plane8(port->plane).data() + first;
       for (int32_t x = left; x < right; ++x, out += colStep) *out = *in++;
     } else {
