@@ -254,6 +254,45 @@ class TexelRows {
   ChannelRows in_{};
 };
 
+// A point of a mesh triangle in result pixels, with its source point.
+struct MappedPoint {
+  double x, y, u, v;
+};
+
+// Grows box (u0, v0, u1, v1) by the source points of the part of triangle
+// (a, b, c) that lies in [x0, x1] x [y0, y1]. The map is affine over the
+// triangle, so a point on an edge takes its source point by the same share.
+void AddClippedTriangle(const MappedPoint& a, const MappedPoint& b, const MappedPoint& c, double x0,
+                        double y0, double x1, double y1, double box[4]) {
+  std::array<MappedPoint, 9> points{a, b, c}, kept{};
+  std::size_t count = 3;
+  // Keeps the side of one edge of the rectangle: side(p) >= 0 inside.
+  const auto clip = [&](auto side) {
+    std::size_t out = 0;
+    for (std::size_t k = 0; k < count; ++k) {
+      const MappedPoint& p = points[k];
+      const MappedPoint& q = points[(k + 1) % count];
+      const double sp = side(p), sq = side(q);
+      if (sp >= 0) kept[out++] = p;
+      if ((sp >= 0) != (sq >= 0)) {
+        const double t = sp / (sp - sq);
+        kept[out++] = {p.x + t * (q.x - p.x), p.y + t * (q.y - p.y), p.u + t * (q.u - p.u),
+                       p.v + t * (q.v - p.v)};
+      }
+    }
+    points = kept;
+    count = out;
+  };
+  clip([&](const MappedPoint& p) { return p.x - x0; });
+  clip([&](const MappedPoint& p) { return x1 - p.x; });
+  clip([&](const MappedPoint& p) { return p.y - y0; });
+  clip([&](const MappedPoint& p) { return y1 - p.y; });
+  for (std::size_t k = 0; k < count; ++k) {
+    box[0] = std::min(box[0], points[k].u), box[2] = std::max(box[2], points[k].u);
+    box[1] = std::min(box[1], points[k].v), box[3] = std::max(box[3], points[k].v);
+  }
+}
+
 std::int32_t NextPowerOfTwo(std::int32_t n) {
   std::int32_t p = 1;
   while (p < n) p *= 2;
@@ -321,6 +360,7 @@ void PResult::InvalidateAll() {
 }
 
 void PResult::BuildTileIndex() {
+  lastPlacement_.valid = false;
   tilesAcross_ = (resultWidth_ + kTile - 1) / kTile;
   tilesDown_ = (resultHeight_ + kTile - 1) / kTile;
   tileCells_.assign(std::size_t(tilesAcross_) * std::size_t(tilesDown_), {});
@@ -403,7 +443,88 @@ void PResult::BuildTileIndex() {
   }
 }
 
+void PResult::NarrowTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const {
+  const Solver& solver = filter_.Constraints().GetSolver();
+  const std::int32_t n = solver.GridSize();
+  const std::vector<float>& positions = solver.Positions();
+  const std::vector<float>& tex = solver.TexCoords();
+  const double width = resultWidth_, height = resultHeight_;
+  const double gridLeft = meshOriginX_ - 0.5 * meshScaleX_;
+  const double gridTop = meshOriginY_ + 0.5 * meshScaleY_;
+  const auto corner = [&](std::int32_t i, std::int32_t j) {
+    const std::size_t at = (std::size_t(j) * std::size_t(n) + std::size_t(i)) * 2;
+    return MappedPoint{(positions[at] - gridLeft) / meshScaleX_ * width,
+                       (gridTop - positions[at + 1]) / meshScaleY_ * height, tex[at] * width,
+                       (1.0 - tex[at + 1]) * height};
+  };
+  // The tile's pixels, a little wider than their centres reach.
+  constexpr double kSlack = 2.0;
+  const double x0 = col * kTile - kSlack, y0 = row * kTile - kSlack;
+  const double x1 = std::min<double>((col + 1) * kTile, width) + kSlack;
+  const double y1 = std::min<double>((row + 1) * kTile, height) + kSlack;
+  double box[4] = {INFINITY, INFINITY, -INFINITY, -INFINITY};
+  for (const auto& [i, j] : TileCells(col, row)) {
+    const MappedPoint a = corner(i, j), b = corner(i + 1, j);
+    const MappedPoint c = corner(i + 1, j + 1), d = corner(i, j + 1);
+    // Either diagonal may split the cell as it is drawn.
+    AddClippedTriangle(a, b, c, x0, y0, x1, y1, box);
+    AddClippedTriangle(a, c, d, x0, y0, x1, y1, box);
+    AddClippedTriangle(a, b, d, x0, y0, x1, y1, box);
+    AddClippedTriangle(b, c, d, x0, y0, x1, y1, box);
+  }
+  if (!(box[0] <= box[2] && box[1] <= box[3])) return;
+
+  // The bicubic kernel reads from a texel before the point's to two after,
+  // the point being half a texel off the texels' corners.
+  constexpr double kReach = 3.0;
+  const auto left = std::int32_t(std::floor(box[0] - kReach));
+  const auto top = std::int32_t(std::floor(box[1] - kReach));
+  const auto right = std::int32_t(std::ceil(box[2] + kReach));
+  const auto bottom = std::int32_t(std::ceil(box[3] + kReach));
+  // The window within the texture as placed: the picture's part of it, and
+  // the zeros around the picture where the window reaches them.
+  const std::int32_t spanLeft = place.sourceLeft - place.padLeft;
+  const std::int32_t spanTop = place.sourceTop - place.padTop;
+  const std::int32_t spanRight = spanLeft + place.textureWidth;
+  const std::int32_t spanBottom = spanTop + place.textureHeight;
+  const std::int32_t keepLeft = std::max(left, place.sourceLeft);
+  const std::int32_t keepTop = std::max(top, place.sourceTop);
+  const std::int32_t keepRight = std::min(right, place.sourceLeft + place.sourceWidth);
+  const std::int32_t keepBottom = std::min(bottom, place.sourceTop + place.sourceHeight);
+  if (keepLeft >= keepRight || keepTop >= keepBottom) return;
+  const std::int32_t padLeft = std::max(0, keepLeft - std::max(left, spanLeft));
+  const std::int32_t padTop = std::max(0, keepTop - std::max(top, spanTop));
+  const std::int32_t padRight = std::max(0, std::min(right, spanRight) - keepRight);
+  const std::int32_t padBottom = std::max(0, std::min(bottom, spanBottom) - keepBottom);
+  // Sizes in steps of 32 texels, so that textures kept from tile to tile
+  // fit most tiles; the texels added are zeros the kernel does not reach.
+  const auto step = [](std::int32_t size) { return (size + 31) / 32 * 32; };
+  const std::int32_t textureWidth = step(padLeft + (keepRight - keepLeft) + padRight);
+  const std::int32_t textureHeight = step(padTop + (keepBottom - keepTop) + padBottom);
+  if (textureWidth >= place.textureWidth && textureHeight >= place.textureHeight) return;
+  place.sourceLeft = keepLeft;
+  place.sourceTop = keepTop;
+  place.sourceWidth = keepRight - keepLeft;
+  place.sourceHeight = keepBottom - keepTop;
+  place.padLeft = padLeft;
+  place.padTop = padTop;
+  place.textureWidth = textureWidth;
+  place.textureHeight = textureHeight;
+}
+
 bool PResult::PlaceTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const {
+  // A tile is placed for its texture ahead and again for its geometry.
+  if (!lastPlacement_.valid || lastPlacement_.col != col || lastPlacement_.row != row) {
+    lastPlacement_.placed = Place(col, row, lastPlacement_.place);
+    lastPlacement_.col = col;
+    lastPlacement_.row = row;
+    lastPlacement_.valid = true;
+  }
+  place = lastPlacement_.place;
+  return lastPlacement_.placed;
+}
+
+bool PResult::Place(std::int32_t col, std::int32_t row, TexturePlacement& place) const {
   place = {};
   const CellSet& cellSet = TileCells(col, row);
   if (cellSet.empty()) return false;
@@ -460,6 +581,7 @@ bool PResult::PlaceTexture(std::int32_t col, std::int32_t row, TexturePlacement&
   place.textureWidth = place.sourceWidth + extraX;
   place.textureHeight = place.sourceHeight + extraY;
   if (place.textureWidth < 1 || place.textureHeight < 1) return false;
+  NarrowTexture(col, row, place);
   if (!hub_.NpotTextures()) {
     // The source moves to the far side of the larger texture.
     const std::int32_t w = NextPowerOfTwo(place.textureWidth);
@@ -764,7 +886,7 @@ void PResult::DropBlocks() {
 }
 
 void PResult::FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
-                        std::uint32_t drawing) {
+                        std::uint32_t drawing, std::uint32_t* stepCount) {
   ahead_.valid = false;
   // Tiles go row by row.
   std::int32_t nextCol = col + 1, nextRow = row;
@@ -778,6 +900,7 @@ void PResult::FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int
   ahead_.row = nextRow;
   ahead_.texture = TextureOfSize(next.textureWidth, next.textureHeight, drawing);
   ahead_.late.clear();
+  if (stepCount != nullptr && !BringUpToDate(hub_.Source(), next.source, true, *stepCount)) return;
   FillMargins(next, ahead_.texture);
   FillPicture(source, next, ahead_.texture, {next.source}, &ahead_.late);
   ahead_.valid = true;
@@ -970,7 +1093,7 @@ void PResult::DrawAhead(std::int32_t col, std::int32_t row, std::uint32_t& stepC
     ahead_.valid = false;
     DrawTilePass(gl, pass);
     inflight_ = {true, nextCol, nextRow, placement_, gl.DrawCount()};
-    FillAhead(*pixels, nextCol, nextRow, pass.texture);
+    FillAhead(*pixels, nextCol, nextRow, pass.texture, &stepCount);
   } catch (...) {
     ahead_.valid = false;
     inflight_.valid = false;

@@ -134,6 +134,13 @@ class PResult : public Tarsa::CPixProcess {
   // The texture placement of tile (col, row); false for a tile with no cells
   // or no texture.
   bool PlaceTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
+  bool Place(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
+  // Narrows place to the source pixels the tile's own pixels read: the
+  // parts of its cells' triangles inside the tile, mapped to the source,
+  // with the kernel's reach around them. Most of a tile's cells reach well
+  // beyond it; a texture of all of them holds several times the pixels the
+  // tile shows.
+  void NarrowTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
   // Texels [x0, x1) x [y0, y1) of a texture placed at place into texels_,
   // rows of x1 - x0 texels: the source's pixels where the picture lies,
   // zeros elsewhere.
@@ -155,11 +162,12 @@ class PResult : public Tarsa::CPixProcess {
   const TexelBlock& Block(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
                           const Tarsa::CRect& rect);
   void DropBlocks();
-  // Fills a texture for the tile expected after (col, row) from the source
-  // tiles read so far, while the GL draws from drawing; the context is
-  // current.
+  // Fills a texture for the tile expected after (col, row) while the GL
+  // draws from drawing; the context is current. With a step count the
+  // source under that tile is read first, counted there; without, from the
+  // source tiles read so far.
   void FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
-                 std::uint32_t drawing);
+                 std::uint32_t drawing, std::uint32_t* stepCount = nullptr);
   // Gives the GL the tile expected after (col, row) to draw, from the
   // texture filled ahead, its source read now where it was not: the GL
   // draws while the caller passes (col, row) on. Nothing when the next tile
@@ -221,6 +229,14 @@ class PResult : public Tarsa::CPixProcess {
   std::uint64_t textureUses_ = 0;
   TextureAhead ahead_;
   TileInFlight inflight_;
+  // The placement last made, for the tile it was made for.
+  struct {
+    bool valid = false;
+    std::int32_t col = 0;
+    std::int32_t row = 0;
+    bool placed = false;
+    TexturePlacement place;
+  } mutable lastPlacement_;
   std::vector<TexelBlock> blocks_;
   // Per cell of the source stage, row by row: its index in blocks_, or -1.
   std::vector<std::int32_t> blockIndex_;

@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "framework/core/CException.h"
+#include "framework/pixels/CBasicPixmap.h"
 
 namespace Tarsa {
 
@@ -101,11 +102,22 @@ void CPixmap::CopyFrom(const CPixmap& source, const CRect& area) {
   if (r.IsEmpty()) return;
   const std::uint32_t planes = std::min(planes_, source.Planes());
   const auto width = std::uint32_t(r.Width());
-  std::vector<std::uint8_t> row(std::size_t(width) * RowSampleBytes());
+  // A pixmap in plain memory holds its rows as rows pass: the copy goes
+  // straight from or into its samples, with no row in between.
+  const auto* from = depth_ >= 8 ? dynamic_cast<const CBasicPixmap*>(&source) : nullptr;
+  auto* into = depth_ >= 8 ? dynamic_cast<CBasicPixmap*>(this) : nullptr;
+  std::vector<std::uint8_t> row;
+  if (from == nullptr && into == nullptr) row.resize(std::size_t(width) * RowSampleBytes());
   for (std::uint32_t plane = 0; plane < planes; ++plane) {
     for (std::int32_t y = r.top; y < r.bottom; ++y) {
-      source.ReadRow(plane, r.left, y, width, row.data());
-      WriteRow(plane, r.left, y, width, row.data());
+      if (from != nullptr) {
+        WriteRow(plane, r.left, y, width, from->Address(plane, r.left, y));
+      } else if (into != nullptr) {
+        source.ReadRow(plane, r.left, y, width, into->Address(plane, r.left, y));
+      } else {
+        source.ReadRow(plane, r.left, y, width, row.data());
+        WriteRow(plane, r.left, y, width, row.data());
+      }
     }
   }
 }

@@ -1,23 +1,53 @@
 #include "framework/pixels/SampleInterleave.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace Tarsa {
 
 namespace {
 
+// One pointer a plane, each restrict, so that the compiler knows the rows
+// apart and vectorises the loop.
+template <typename Sample, typename... Plane>
+void Interleave(std::size_t count, Sample* __restrict pixels, const Plane* __restrict... planes) {
+  constexpr std::size_t kN = sizeof...(Plane);
+  for (std::size_t x = 0; x < count; ++x) {
+    std::size_t k = 0;
+    ((pixels[x * kN + k++] = planes[x]), ...);
+  }
+}
+
+template <typename Sample, typename... Plane>
+void Deinterleave(std::size_t count, const Sample* __restrict pixels, Sample cap,
+                  Plane* __restrict... planes) {
+  constexpr std::size_t kN = sizeof...(Plane);
+  for (std::size_t x = 0; x < count; ++x) {
+    std::size_t k = 0;
+    ((planes[x] = std::min(pixels[x * kN + k++], cap)), ...);
+  }
+}
+
+template <std::size_t N, typename Sample, std::size_t... K>
+void InterleaveRows(const Sample* const* planes, std::size_t count, Sample* pixels,
+                    std::index_sequence<K...>) {
+  Interleave(count, pixels, planes[K]...);
+}
+
+template <std::size_t N, typename Sample, std::size_t... K>
+void DeinterleaveRows(const Sample* pixels, std::size_t count, Sample* const* planes, Sample cap,
+                      std::index_sequence<K...>) {
+  Deinterleave(count, pixels, cap, planes[K]...);
+}
+
 template <std::size_t N, typename Sample>
 void Interleave(const Sample* const* planes, std::size_t count, Sample* pixels) {
-  for (std::size_t x = 0; x < count; ++x) {
-    for (std::size_t k = 0; k < N; ++k) pixels[x * N + k] = planes[k][x];
-  }
+  InterleaveRows<N>(planes, count, pixels, std::make_index_sequence<N>());
 }
 
 template <std::size_t N, typename Sample>
 void Deinterleave(const Sample* pixels, std::size_t count, Sample* const* planes, Sample cap) {
-  for (std::size_t x = 0; x < count; ++x) {
-    for (std::size_t k = 0; k < N; ++k) planes[k][x] = std::min(pixels[x * N + k], cap);
-  }
+  DeinterleaveRows<N>(pixels, count, planes, cap, std::make_index_sequence<N>());
 }
 
 }  // namespace

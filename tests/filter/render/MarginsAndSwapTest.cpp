@@ -193,13 +193,15 @@ using Swap = RenderRun;
 
 // The host's offer cannot take the limit below its floor of 32 MiB, more
 // than stages of a size that renders quickly; the service's setter, which
-// the prepare calls with the host's figure, takes it to 1 MiB, a fifth of
-// the source and result stages of this image. The tiles sent out must come
-// back as they went: the result equals, bit for bit, the same run held in
-// memory (same tiles, same order, same GL state).
+// the prepare calls with the host's figure, takes it to 256 KiB, a
+// twentieth of the source and result stages of this image: less than the
+// source tiles a tile's texture reads ahead, so tiles go out before they
+// have been used. The tiles sent out must come back as they went: the
+// result equals, bit for bit, the same run held in memory (same tiles, same
+// order, same GL state).
 TEST_F(Swap, ImageAboveTheLimitRendersThroughTheSwapAsInMemory) {
   const TestSupport::ScratchFolder scratch;
-  constexpr std::uint64_t kLimit = 1 << 20;
+  constexpr std::uint64_t kLimit = 1 << 18;
   Rendered swapped, held;
   ASSERT_NO_FATAL_FAILURE(RenderWithLimit(kLimit, scratch.Dir(), swapped));
   EXPECT_EQ(swapped.hostLimit, 0x2000000u) << "no offer: the floor";
