@@ -4,12 +4,15 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <utility>
 #include <vector>
 
 #include "filter/PFilter.h"
+#include "filter/PImageHub.h"
+#include "filter/PResult.h"
 #include "framework/plugin/CPluginEntry.h"
 #include "solver/frame/Solver.h"
 #include "tests/filter/render/ReferenceRender.h"
@@ -158,6 +161,56 @@ TEST_F(FinalRender, TiledResultMatchesTheMeshRenderedWhole) {
   // Pixel centres on a cell's edge may fall to the other triangle, which
   // samples a hair's breadth away: a few pixels per hundred cells.
   EXPECT_LE(tally.failed, tally.compared / 200) << tally.failed << " of " << tally.compared;
+}
+
+// A tile's texture holds only the source pixels its own pixels read, with
+// the kernel's reach: every texel the bicubic kernel takes for a pixel of
+// the tile (the CPU rendering's source point, 4 x 4 texels around it,
+// clamped to the picture) must lie in the tile's source rectangle, or the
+// tile would draw from a clamped edge instead. The texture must also be
+// narrower than all its cells' source tiles, or the narrowing is gone.
+TEST_F(FinalRender, EachTileTextureHoldsEveryTexelItsPixelsRead) {
+  CallbackHost host(ImageMode::kRgb, 333, 222, false);
+  FillSmooth(*host.document);
+  ShaderPFilter filter;
+  ASSERT_EQ(RunScripted(host, filter), 0);
+  const Solver& solver = filter.Constraints().GetSolver();
+  const std::int32_t w = host.document->Width(), h = host.document->Height();
+  const ReferenceImage reference = RenderReference(
+      solver, w, h, 1, [](std::int32_t, std::int32_t, std::int32_t) { return 0.0; });
+  PResult& result = filter.ImageHub().ResultFull();
+  result.SetRect(filter.ImageHub().SourceRect());
+  std::int64_t texels = 0, pixels = 0, outside = 0;
+  for (std::int32_t row = 0; row < std::int32_t(result.Rows()); ++row) {
+    for (std::int32_t col = 0; col < std::int32_t(result.Columns()); ++col) {
+      Tarsa::CRect held;
+      if (!result.PrepareTile(col, row, held)) continue;
+      texels += std::int64_t(held.Width()) * held.Height();
+      for (std::int32_t y = row * 128; y < std::min(h, (row + 1) * 128); ++y) {
+        for (std::int32_t x = col * 128; x < std::min(w, (col + 1) * 128); ++x) {
+          if (!reference.Covered(x, y)) continue;
+          ++pixels;
+          // Texel centres lie at whole numbers after taking off half a texel.
+          const double px = reference.sourceX[reference.Index(x, y)] - 0.5;
+          const double py = reference.sourceY[reference.Index(x, y)] - 0.5;
+          const auto first = [](double p, std::int32_t size) {
+            return std::clamp(std::int32_t(std::floor(p)) - 1, 0, size - 1);
+          };
+          const auto last = [](double p, std::int32_t size) {
+            return std::clamp(std::int32_t(std::floor(p)) + 2, 0, size - 1);
+          };
+          const bool inside = first(px, w) >= held.left && last(px, w) < held.right &&
+                              first(py, h) >= held.top && last(py, h) < held.bottom;
+          if (!inside) ++outside;
+        }
+      }
+    }
+  }
+  ASSERT_GT(pixels, w * h / 2);
+  EXPECT_EQ(outside, 0) << "of " << pixels << " pixels";
+  // Each tile's texture rounds up to whole source tiles of 129 pixels
+  // without the narrowing: some 4 texels a pixel or more here.
+  EXPECT_LT(double(texels) / double(pixels), 2.5);
 }
 
 // Every mode at both depths, with and without transparency: the planes are
