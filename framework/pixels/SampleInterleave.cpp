@@ -1,7 +1,13 @@
 #include "framework/pixels/SampleInterleave.h"
 
 #include <algorithm>
+#include <array>
 #include <utility>
+
+#if defined(__x86_64__) || defined(__i386__)
+#include <immintrin.h>
+#define TARSA_X86_SHUFFLES 1
+#endif
 
 namespace Tarsa {
 
@@ -50,12 +56,96 @@ void Deinterleave(const Sample* pixels, std::size_t count, Sample* const* planes
   DeinterleaveRows<N>(pixels, count, planes, cap, std::make_index_sequence<N>());
 }
 
+#if defined(TARSA_X86_SHUFFLES)
+// Three planes of bytes, 16 pixels at a time, with byte shuffles: each
+// vector of 16 bytes is gathered or scattered by a mask, 0x80 leaving a
+// zero to be filled from another vector.
+struct ShuffleMasks {
+  // Pixel vector v's bytes from plane k; plane k's bytes from pixel vector v.
+  std::array<std::array<std::array<std::uint8_t, 16>, 3>, 3> toPixels{};  // [v][k]
+  std::array<std::array<std::array<std::uint8_t, 16>, 3>, 3> toPlanes{};  // [k][v]
+  constexpr ShuffleMasks() {
+    for (int v = 0; v < 3; ++v) {
+      for (int k = 0; k < 3; ++k) {
+        for (int j = 0; j < 16; ++j) {
+          const int i = 16 * v + j;  // a byte of the pixels
+          toPixels[v][k][j] = i % 3 == k ? std::uint8_t(i / 3) : 0x80;
+          const int from = 3 * j + k;  // pixel j's sample k
+          toPlanes[k][v][j] = from / 16 == v ? std::uint8_t(from % 16) : 0x80;
+        }
+      }
+    }
+  }
+};
+constexpr ShuffleMasks kMasks;
+
+__m128i Mask(const std::array<std::uint8_t, 16>& bytes) {
+  return _mm_loadu_si128(reinterpret_cast<const __m128i*>(bytes.data()));
+}
+
+// Both answer how many pixels they took, a multiple of 16.
+__attribute__((target("ssse3"))) std::size_t InterleaveThree(const std::uint8_t* a,
+                                                             const std::uint8_t* b,
+                                                             const std::uint8_t* c,
+                                                             std::size_t count,
+                                                             std::uint8_t* pixels) {
+  std::size_t x = 0;
+  for (; x + 16 <= count; x += 16) {
+    const __m128i planes[3] = {_mm_loadu_si128(reinterpret_cast<const __m128i*>(a + x)),
+                               _mm_loadu_si128(reinterpret_cast<const __m128i*>(b + x)),
+                               _mm_loadu_si128(reinterpret_cast<const __m128i*>(c + x))};
+    for (int v = 0; v < 3; ++v) {
+      __m128i out = _mm_shuffle_epi8(planes[0], Mask(kMasks.toPixels[v][0]));
+      out = _mm_or_si128(out, _mm_shuffle_epi8(planes[1], Mask(kMasks.toPixels[v][1])));
+      out = _mm_or_si128(out, _mm_shuffle_epi8(planes[2], Mask(kMasks.toPixels[v][2])));
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(pixels + 3 * x + 16 * v), out);
+    }
+  }
+  return x;
+}
+
+__attribute__((target("ssse3"))) std::size_t DeinterleaveThree(const std::uint8_t* pixels,
+                                                               std::size_t count, std::uint8_t cap,
+                                                               std::uint8_t* a, std::uint8_t* b,
+                                                               std::uint8_t* c) {
+  std::uint8_t* const planes[3] = {a, b, c};
+  const __m128i top = _mm_set1_epi8(char(cap));
+  std::size_t x = 0;
+  for (; x + 16 <= count; x += 16) {
+    const __m128i in[3] = {_mm_loadu_si128(reinterpret_cast<const __m128i*>(pixels + 3 * x)),
+                           _mm_loadu_si128(reinterpret_cast<const __m128i*>(pixels + 3 * x + 16)),
+                           _mm_loadu_si128(reinterpret_cast<const __m128i*>(pixels + 3 * x + 32))};
+    for (int k = 0; k < 3; ++k) {
+      __m128i out = _mm_shuffle_epi8(in[0], Mask(kMasks.toPlanes[k][0]));
+      out = _mm_or_si128(out, _mm_shuffle_epi8(in[1], Mask(kMasks.toPlanes[k][1])));
+      out = _mm_or_si128(out, _mm_shuffle_epi8(in[2], Mask(kMasks.toPlanes[k][2])));
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(planes[k] + x), _mm_min_epu8(out, top));
+    }
+  }
+  return x;
+}
+
+bool HasShuffles() {
+  static const bool has = __builtin_cpu_supports("ssse3") != 0;
+  return has;
+}
+#endif
+
 }  // namespace
 
 template <typename Sample>
 void PlanesToPixels(std::span<const Sample* const> planes, std::size_t count, std::size_t stride,
                     Sample* pixels) {
   if (planes.size() == stride) {
+#if defined(TARSA_X86_SHUFFLES)
+    if constexpr (sizeof(Sample) == 1) {
+      if (stride == 3 && HasShuffles()) {
+        const std::size_t done = InterleaveThree(planes[0], planes[1], planes[2], count, pixels);
+        const Sample* rest[3] = {planes[0] + done, planes[1] + done, planes[2] + done};
+        return Interleave<3>(rest, count - done, pixels + 3 * done);
+      }
+    }
+#endif
     switch (stride) {
       case 1:
         return Interleave<1>(planes.data(), count, pixels);
@@ -81,6 +171,16 @@ template <typename Sample>
 void PixelsToPlanes(const Sample* pixels, std::size_t stride, std::size_t count,
                     std::span<Sample* const> planes, Sample cap) {
   if (planes.size() == stride) {
+#if defined(TARSA_X86_SHUFFLES)
+    if constexpr (sizeof(Sample) == 1) {
+      if (stride == 3 && HasShuffles()) {
+        const std::size_t done =
+            DeinterleaveThree(pixels, count, cap, planes[0], planes[1], planes[2]);
+        Sample* const rest[3] = {planes[0] + done, planes[1] + done, planes[2] + done};
+        return Deinterleave<3>(pixels + 3 * done, count - done, rest, cap);
+      }
+    }
+#endif
     switch (stride) {
       case 1:
         return Deinterleave<1>(pixels, count, planes.data(), cap);
