@@ -49,6 +49,17 @@ void BlockExchange::Transfer(const Block& block, bool toDocument) {
   for (int32_t y = block.rect.top; y < block.rect.bottom; ++y) {
     const size_t first = static_cast<size_t>(y) * width + static_cast<size_t>(block.rect.left);
     for (size_t p = 0; p < planes; ++p) reads[p] = rows[p] = planeStarts[p] + first;
+    // Each row lies on a page of its own, where the processor does not
+    // fetch ahead by itself: rows a few ahead are asked for now.
+    constexpr int32_t kAhead = 4;
+    if (y + kAhead < block.rect.bottom) {
+      const size_t ahead = first + static_cast<size_t>(kAhead) * width;
+      const size_t bytes = columns * sizeof(Sample);
+      for (size_t p = 0; p < planes; ++p) {
+        const auto* row = reinterpret_cast<const char*>(planeStarts[p] + ahead);
+        for (size_t at = 0; at < bytes; at += 64) __builtin_prefetch(row + at);
+      }
+    }
     auto* cells = reinterpret_cast<Sample*>(
         block.bytes.get() + static_cast<size_t>(y - block.rect.top) * block.rowBytes);
     if (toDocument) {
