@@ -33,7 +33,9 @@ int PFinal::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCount
   if (!BringUpToDate(result_, tile, wait, stepCount)) return 1;
   const Tarsa::CRect area = tile.Intersect(rect_);
   if (!area.IsEmpty()) {
-    Tarsa::CMemoryPixmap pixmap(area, std::uint32_t(planesToWrite_), host_.Depth());
+    // Every sample is copied in before it goes out.
+    Tarsa::CMemoryPixmap pixmap(area, std::uint32_t(planesToWrite_), host_.Depth(),
+                                Tarsa::CMemoryPixmap::Contents::kUnset);
     pixmap.CopyFrom(*result_.Pixels(), area);
     host_.WritePixmap(pixmap, area, planesToWrite_);
   }

@@ -683,7 +683,12 @@ int PResult::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCoun
     currentRow_ = row;
   }
 
-  Tarsa::CMemoryPixmap dest(tile, planes_, depth_);
+  // Drawn tiles come back whole, every plane; a tile without cells stays
+  // transparent.
+  const bool drawn = hub_.GLUsable() && currentHasCells_;
+  Tarsa::CMemoryPixmap dest(
+      tile, planes_, depth_,
+      drawn ? Tarsa::CMemoryPixmap::Contents::kUnset : Tarsa::CMemoryPixmap::Contents::kZeros);
   if (!hub_.GLUsable()) {
     // No warp without OpenGL: the result is the source.
     if (!BringUpToDate(source, tile, wait, stepCount)) return 1;
