@@ -72,6 +72,19 @@ void Interleave8(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
   }
 }
 
+#if defined(__SSE2__)
+// Eight RGBA texels of 16-bit channels from eight samples of each channel.
+inline void StoreTexels16(__m128i r, __m128i g, __m128i b, __m128i a, std::uint8_t* out) {
+  const __m128i rgLow = _mm_unpacklo_epi16(r, g), rgHigh = _mm_unpackhi_epi16(r, g);
+  const __m128i baLow = _mm_unpacklo_epi16(b, a), baHigh = _mm_unpackhi_epi16(b, a);
+  auto* to = reinterpret_cast<__m128i*>(out);
+  _mm_storeu_si128(to, _mm_unpacklo_epi32(rgLow, baLow));
+  _mm_storeu_si128(to + 1, _mm_unpackhi_epi32(rgLow, baLow));
+  _mm_storeu_si128(to + 2, _mm_unpacklo_epi32(rgHigh, baHigh));
+  _mm_storeu_si128(to + 3, _mm_unpackhi_epi32(rgHigh, baHigh));
+}
+#endif
+
 // 16-bit samples widened to the texture's full range.
 void Interleave16(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
   std::size_t x = 0;
@@ -83,13 +96,7 @@ void Interleave16(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
       return _mm_adds_epu16(s, s);
     };
     const __m128i r = load(in[0]), g = load(in[1]), b = load(in[2]), a = load(in[3]);
-    const __m128i rgLow = _mm_unpacklo_epi16(r, g), rgHigh = _mm_unpackhi_epi16(r, g);
-    const __m128i baLow = _mm_unpacklo_epi16(b, a), baHigh = _mm_unpackhi_epi16(b, a);
-    auto* to = reinterpret_cast<__m128i*>(out + x * 8);
-    _mm_storeu_si128(to, _mm_unpacklo_epi32(rgLow, baLow));
-    _mm_storeu_si128(to + 1, _mm_unpackhi_epi32(rgLow, baLow));
-    _mm_storeu_si128(to + 2, _mm_unpacklo_epi32(rgHigh, baHigh));
-    _mm_storeu_si128(to + 3, _mm_unpackhi_epi32(rgHigh, baHigh));
+    StoreTexels16(r, g, b, a, out + x * 8);
   }
 #endif
   for (; x < count; ++x) {
@@ -97,7 +104,7 @@ void Interleave16(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
   }
 }
 
-#if defined(ARCHWAY_X86_TEXELS)
+#if defined(ARCHWAY_X86_TEXELS) && defined(__SSE2__)
 // As Interleave16, each widened sample as the half float of its share of
 // 65535, rounded to nearest even: what the GL stores for a 16-bit integer
 // in a half-float texture, so the texture holds the same bits either way.
@@ -121,13 +128,7 @@ __attribute__((target("f16c"))) void InterleaveHalf(const ChannelRows& in, std::
   for (; x + 8 <= count; x += 8) {
     const __m128i r = EightHalves(in[0] + x * 2), g = EightHalves(in[1] + x * 2);
     const __m128i b = EightHalves(in[2] + x * 2), a = EightHalves(in[3] + x * 2);
-    const __m128i rgLow = _mm_unpacklo_epi16(r, g), rgHigh = _mm_unpackhi_epi16(r, g);
-    const __m128i baLow = _mm_unpacklo_epi16(b, a), baHigh = _mm_unpackhi_epi16(b, a);
-    auto* to = reinterpret_cast<__m128i*>(out + x * 8);
-    _mm_storeu_si128(to, _mm_unpacklo_epi32(rgLow, baLow));
-    _mm_storeu_si128(to + 1, _mm_unpackhi_epi32(rgLow, baLow));
-    _mm_storeu_si128(to + 2, _mm_unpacklo_epi32(rgHigh, baHigh));
-    _mm_storeu_si128(to + 3, _mm_unpackhi_epi32(rgHigh, baHigh));
+    StoreTexels16(r, g, b, a, out + x * 8);
   }
   for (; x < count; ++x) {
     for (std::size_t c = 0; c < 4; ++c) {
