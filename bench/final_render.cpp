@@ -29,7 +29,7 @@
 // host; tile_floor_ms, as many clear-and-read-back passes as there are
 // tiles, a tile's round trip through the GL with nothing drawn; and the
 // source pixels the tiles' textures hold per output pixel (texel_ratio)
-// beside the fewest their cells need (needed_texel_ratio).
+// beside what the boxes of their whole cells would (cells_texel_ratio).
 #include <benchmark/benchmark.h>
 
 #include <malloc.h>
@@ -423,12 +423,12 @@ void BM_FinalRender16(benchmark::State& state) { RunFinalRender<std::uint16_t>(s
 BENCHMARK(BM_FinalRender8)->Iterations(3)->UseManualTime()->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_FinalRender16)->Iterations(3)->UseManualTime()->Unit(benchmark::kMillisecond);
 
-// The source pixels the tile's texture holds, and the fewest it could: the
-// box of its cells' texture coordinates with the bicubic kernel's reach of
-// two pixels, inside the picture.
+// The source pixels the tile's texture holds, and what a texture of its
+// whole cells would: the box of their texture coordinates with the bicubic
+// kernel's reach of two pixels, inside the picture.
 struct TileTexels {
   double held = 0;
-  double needed = 0;
+  double cells = 0;
 };
 
 TileTexels TexelsOf(PResult& result, const Solver& solver, std::int32_t col, std::int32_t row) {
@@ -449,7 +449,7 @@ TileTexels TexelsOf(PResult& result, const Solver& solver, std::int32_t col, std
   }
   const double width = std::min(right + 2, double(kWidth)) - std::max(left - 2, 0.0);
   const double height = std::min(bottom + 2, double(kHeight)) - std::max(top - 2, 0.0);
-  texels.needed = std::max(width, 0.0) * std::max(height, 0.0);
+  texels.cells = std::max(width, 0.0) * std::max(height, 0.0);
   return texels;
 }
 
@@ -483,7 +483,7 @@ void RunStages(benchmark::State& state) {
       for (std::int32_t col = 0; col < std::int32_t(result.Columns()); ++col) {
         const TileTexels tile = TexelsOf(result, scene.GetSolver(), col, row);
         texels.held += tile.held;
-        texels.needed += tile.needed;
+        texels.cells += tile.cells;
       }
     }
     geometry.push_back(Since(start));
@@ -523,10 +523,9 @@ void RunStages(benchmark::State& state) {
   state.counters["tiles_ms"] = Median(tiles) * 1e3;
   state.counters["write_ms"] = Median(write) * 1e3;
   state.counters["tile_floor_ms"] = Median(floor) * 1e3;
-  // Source pixels packed and uploaded per output pixel, and the least the
-  // tiles' cells need.
+  // Source pixels uploaded per output pixel, and what whole cells would take.
   state.counters["texel_ratio"] = texels.held / (kMegapixels * 1e6);
-  state.counters["needed_texel_ratio"] = texels.needed / (kMegapixels * 1e6);
+  state.counters["cells_texel_ratio"] = texels.cells / (kMegapixels * 1e6);
   state.counters["agree_pct"] = AgreePercent(rendered, scene);
 }
 
