@@ -153,6 +153,19 @@ bool CanMakeHalves() { return false; }
 // RGBA read back into four planes' rows, count pixels.
 using PlaneRows = std::array<std::uint8_t*, 4>;
 
+#if defined(__SSE2__)
+// Channels sorted into halves (R and G in the low and high halves of the
+// rg vectors, B and A of the ba ones) to their planes' rows.
+template <typename Store>
+void StorePlanes(__m128i rgLow, __m128i rgHigh, __m128i baLow, __m128i baHigh, const PlaneRows& out,
+                 const Store& store) {
+  store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
+  store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
+  store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
+  store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
+}
+#endif
+
 void Deinterleave8(const std::uint8_t* in, std::size_t count, const PlaneRows& out) {
   std::size_t x = 0;
 #if defined(__SSE2__)
@@ -170,10 +183,7 @@ void Deinterleave8(const std::uint8_t* in, std::size_t count, const PlaneRows& o
     const auto store = [x](std::uint8_t* row, __m128i v) {
       _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x), v);
     };
-    store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
-    store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
-    store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
-    store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
+    StorePlanes(rgLow, rgHigh, baLow, baHigh, out, store);
   }
 #endif
   for (; x < count; ++x) {
@@ -199,10 +209,7 @@ void Deinterleave16(const std::uint8_t* in, std::size_t count, const PlaneRows& 
       v = _mm_sub_epi16(_mm_srli_epi16(v, 1), _mm_cmpeq_epi16(v, top));
       _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x * 2), v);
     };
-    store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
-    store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
-    store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
-    store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
+    StorePlanes(rgLow, rgHigh, baLow, baHigh, out, store);
   }
 #endif
   for (; x < count; ++x) {
