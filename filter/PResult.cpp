@@ -9,6 +9,7 @@
 #include "filter/PImageHub.h"
 #include "filter/PSource.h"
 #include "framework/pixels/CMemoryPixmap.h"
+#include "framework/pixels/SampleInterleave.h"
 #include "gpu/POpenGLManager.h"
 #include "gpu/POpenGLTile.h"
 #include "solver/frame/Solver.h"
@@ -49,28 +50,6 @@ void Store16(std::uint8_t* at, std::uint16_t v) { std::memcpy(at, &v, 2); }
 // Texture rows are made from one row of each channel's plane: the channels
 // are interleaved into RGBA texels, count of them at out.
 using ChannelRows = std::array<const std::uint8_t*, 4>;
-
-void Interleave8(const ChannelRows& in, std::size_t count, std::uint8_t* out) {
-  std::size_t x = 0;
-#if defined(__SSE2__)
-  for (; x + 16 <= count; x += 16) {
-    const auto load = [x](const std::uint8_t* row) {
-      return _mm_loadu_si128(reinterpret_cast<const __m128i*>(row + x));
-    };
-    const __m128i r = load(in[0]), g = load(in[1]), b = load(in[2]), a = load(in[3]);
-    const __m128i rgLow = _mm_unpacklo_epi8(r, g), rgHigh = _mm_unpackhi_epi8(r, g);
-    const __m128i baLow = _mm_unpacklo_epi8(b, a), baHigh = _mm_unpackhi_epi8(b, a);
-    auto* to = reinterpret_cast<__m128i*>(out + x * 4);
-    _mm_storeu_si128(to, _mm_unpacklo_epi16(rgLow, baLow));
-    _mm_storeu_si128(to + 1, _mm_unpackhi_epi16(rgLow, baLow));
-    _mm_storeu_si128(to + 2, _mm_unpacklo_epi16(rgHigh, baHigh));
-    _mm_storeu_si128(to + 3, _mm_unpackhi_epi16(rgHigh, baHigh));
-  }
-#endif
-  for (; x < count; ++x) {
-    for (std::size_t c = 0; c < 4; ++c) out[x * 4 + c] = in[c][x];
-  }
-}
 
 #if defined(__SSE2__)
 // Eight RGBA texels of 16-bit channels from eight samples of each channel.
@@ -153,44 +132,6 @@ bool CanMakeHalves() { return false; }
 // RGBA read back into four planes' rows, count pixels.
 using PlaneRows = std::array<std::uint8_t*, 4>;
 
-#if defined(__SSE2__)
-// Channels sorted into halves (R and G in the low and high halves of the
-// rg vectors, B and A of the ba ones) to their planes' rows.
-template <typename Store>
-void StorePlanes(__m128i rgLow, __m128i rgHigh, __m128i baLow, __m128i baHigh, const PlaneRows& out,
-                 const Store& store) {
-  store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
-  store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
-  store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
-  store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
-}
-#endif
-
-void Deinterleave8(const std::uint8_t* in, std::size_t count, const PlaneRows& out) {
-  std::size_t x = 0;
-#if defined(__SSE2__)
-  for (; x + 16 <= count; x += 16) {
-    // Three rounds of byte interleaving sort 16 pixels' bytes by channel.
-    const auto* from = reinterpret_cast<const __m128i*>(in + x * 4);
-    const __m128i p0 = _mm_loadu_si128(from), p1 = _mm_loadu_si128(from + 1);
-    const __m128i p2 = _mm_loadu_si128(from + 2), p3 = _mm_loadu_si128(from + 3);
-    const __m128i t0 = _mm_unpacklo_epi8(p0, p1), t1 = _mm_unpackhi_epi8(p0, p1);
-    const __m128i t2 = _mm_unpacklo_epi8(p2, p3), t3 = _mm_unpackhi_epi8(p2, p3);
-    const __m128i u0 = _mm_unpacklo_epi8(t0, t1), u1 = _mm_unpackhi_epi8(t0, t1);
-    const __m128i u2 = _mm_unpacklo_epi8(t2, t3), u3 = _mm_unpackhi_epi8(t2, t3);
-    const __m128i rgLow = _mm_unpacklo_epi8(u0, u1), baLow = _mm_unpackhi_epi8(u0, u1);
-    const __m128i rgHigh = _mm_unpacklo_epi8(u2, u3), baHigh = _mm_unpackhi_epi8(u2, u3);
-    const auto store = [x](std::uint8_t* row, __m128i v) {
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x), v);
-    };
-    StorePlanes(rgLow, rgHigh, baLow, baHigh, out, store);
-  }
-#endif
-  for (; x < count; ++x) {
-    for (std::size_t c = 0; c < 4; ++c) out[c][x] = in[x * 4 + c];
-  }
-}
-
 // 16-bit samples back to the range of the planes.
 void Deinterleave16(const std::uint8_t* in, std::size_t count, const PlaneRows& out) {
   std::size_t x = 0;
@@ -209,7 +150,10 @@ void Deinterleave16(const std::uint8_t* in, std::size_t count, const PlaneRows& 
       v = _mm_sub_epi16(_mm_srli_epi16(v, 1), _mm_cmpeq_epi16(v, top));
       _mm_storeu_si128(reinterpret_cast<__m128i*>(row + x * 2), v);
     };
-    StorePlanes(rgLow, rgHigh, baLow, baHigh, out, store);
+    store(out[0], _mm_unpacklo_epi64(rgLow, rgHigh));
+    store(out[1], _mm_unpackhi_epi64(rgLow, rgHigh));
+    store(out[2], _mm_unpacklo_epi64(baLow, baHigh));
+    store(out[3], _mm_unpackhi_epi64(baLow, baHigh));
   }
 #endif
   for (; x < count; ++x) {
@@ -244,7 +188,7 @@ class TexelRows {
     for (std::size_t k = 0; k < distinct_; ++k)
       source.ReadRow(read_[k], x, y, std::uint32_t(width), buffer_.data() + k * rowBytes_);
     if (sampleBytes_ == 1) {
-      Interleave8(in_, width, out);
+      Tarsa::PlanesToPixels<std::uint8_t>(in_, width, 4, out);
     } else if (halves_) {
       InterleaveHalf(in_, width, out);
     } else {
@@ -957,7 +901,8 @@ void PResult::Unpack(Tarsa::CMemoryPixmap& dest, const Tarsa::CRect& tile,
       if (wide) {
         Deinterleave16(readback_.data() + line * 8, std::size_t(width), to);
       } else {
-        Deinterleave8(readback_.data() + line * 4, std::size_t(width), to);
+        Tarsa::PixelsToPlanes<std::uint8_t>(readback_.data() + line * 4, 4, std::size_t(width), to,
+                                            255);
       }
       continue;
     }
