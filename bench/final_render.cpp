@@ -167,24 +167,13 @@ std::vector<Triangle> MeshTriangles(const Solver& solver) {
   for (std::int32_t j = 0; j < solver.CellCount(); ++j) {
     for (std::int32_t i = 0; i < solver.CellCount(); ++i) {
       if (!solver.IsCellInMask(i, j)) continue;
-      // The cell splits along its shorter diagonal on the sphere, as the
-      // program draws it.
-      float s00[3], s11[3], s10[3], s01[3];
-      sphere.GetPoint(i, j, s00);
-      sphere.GetPoint(i + 1, j + 1, s11);
-      sphere.GetPoint(i + 1, j, s10);
-      sphere.GetPoint(i, j + 1, s01);
-      double falling = 0, rising = 0;
-      for (int k = 0; k < 3; ++k) {
-        falling += double(s00[k] - s11[k]) * (s00[k] - s11[k]);
-        rising += double(s10[k] - s01[k]) * (s10[k] - s01[k]);
-      }
+      // The cell splits as the program draws it.
       const Corner c00 = corner(i, j), c10 = corner(i + 1, j);
       const Corner c01 = corner(i, j + 1), c11 = corner(i + 1, j + 1);
-      if (falling > rising) {
-        add(c00, c01, c10), add(c01, c11, c10);
-      } else {
+      if (sphere.SplitsAlongMainDiagonal(i, j)) {
         add(c00, c01, c11), add(c00, c10, c11);
+      } else {
+        add(c00, c01, c10), add(c01, c11, c10);
       }
     }
   }

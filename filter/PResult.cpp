@@ -12,6 +12,7 @@
 #include "framework/pixels/SampleInterleave.h"
 #include "gpu/POpenGLManager.h"
 #include "gpu/POpenGLTile.h"
+#include "lens/sphere/PhotoToSphere.h"
 #include "solver/frame/Solver.h"
 
 #if defined(__x86_64__) || defined(__i386__)
@@ -597,20 +598,11 @@ bool PResult::PrepareTile(std::int32_t col, std::int32_t row, Tarsa::CRect& out)
       quads_.insert(quads_.end(), {k, k + w, k + w + 1, k + 1});
       continue;
     }
-    // Split along the shorter diagonal on the sphere.
-    float a[3], b[3], p[3], q[3];
-    sphere.GetPoint(c, r, a);
-    sphere.GetPoint(c + 1, r + 1, b);
-    sphere.GetPoint(c + 1, r, p);
-    sphere.GetPoint(c, r + 1, q);
-    const auto squared = [](const float* x, const float* y) {
-      return (x[0] - y[0]) * (x[0] - y[0]) + (x[1] - y[1]) * (x[1] - y[1]) +
-             (x[2] - y[2]) * (x[2] - y[2]);
-    };
-    if (squared(a, b) > squared(p, q)) {
-      triangles_.insert(triangles_.end(), {k, k + w, k + 1, k + w, k + w + 1, k + 1});
-    } else {
+    // Split as the lines were traced.
+    if (sphere.SplitsAlongMainDiagonal(c, r)) {
       triangles_.insert(triangles_.end(), {k, k + w, k + w + 1, k, k + 1, k + w + 1});
+    } else {
+      triangles_.insert(triangles_.end(), {k, k + w, k + 1, k + w, k + w + 1, k + 1});
     }
   }
 
@@ -946,6 +938,7 @@ POpenGLTilePass PResult::TilePass(const Tarsa::CPixmap& source, const Tarsa::CRe
   pass.pictureTexels[1] = float(place.padTop);
   pass.pictureTexels[2] = float(place.padLeft + place.sourceWidth - 1);
   pass.pictureTexels[3] = float(place.padTop + place.sourceHeight - 1);
+  SetCover(pass, 0);
   pass.textureFormat = hub_.TextureFormat();
   pass.pixelFormat = hub_.PixelFormat();
   pass.pixelType = hub_.PixelType();
@@ -960,6 +953,26 @@ POpenGLTilePass PResult::TilePass(const Tarsa::CPixmap& source, const Tarsa::CRe
                    sampleBytes);
   pass.readback = readback_.data();
   return pass;
+}
+
+void PResult::SetCover(POpenGLTilePass& pass, std::uint32_t passIndex) const {
+  const TexturePlacement& place = placement_;
+  const std::shared_ptr<PhotoToSphere>& model = filter_.Constraints().GetSolver().GetImageModel();
+  float uv[2], radius = 0;
+  if (model != nullptr && model->CoverCircle(uv, radius)) {
+    // Into the texture as the texture coordinates go (see Place); rows run
+    // from the top.
+    pass.coverCircle[0] = float(uv[0] * resultWidth_ - place.sourceLeft + place.padLeft - 0.5);
+    pass.coverCircle[1] =
+        float((1.0 - uv[1]) * resultHeight_ - place.sourceTop + place.padTop - 0.5);
+    pass.coverCircle[2] = float(double(radius) * resultWidth_ / model->GetImage()->width);
+  }
+  // With transparency the edge fades the alpha, the last plane, which
+  // rides in the last pass's A; without, every channel fades to the black
+  // of the outside.
+  const bool fadeAll = !hub_.Source().HasAlpha();
+  const bool lastPass = passIndex + 1 == (planes_ < 5 ? 1u : 2u);
+  for (int c = 0; c < 4; ++c) pass.coverScale[c] = fadeAll || (lastPass && c == 3) ? 1.0f : 0.0f;
 }
 
 void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& source,
@@ -990,6 +1003,7 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
     if (!drawn) ahead_.valid = false;
     for (std::uint32_t p = 0; p < passes; ++p) {
       std::uint32_t made = 0;
+      SetCover(pass, p);
       if (!drawn) {
         if (ready) {
           // What was left out has been read by now.

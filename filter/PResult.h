@@ -177,6 +177,9 @@ class PResult : public Tarsa::CPixProcess {
   // sourceRect, up to its texture.
   POpenGLTilePass TilePass(const Tarsa::CPixmap& source, const Tarsa::CRect& sourceRect,
                            std::int32_t col, std::int32_t row);
+  // The camera model's cover circle in the placed texture, and the
+  // channels an edge pixel's covered share scales in that pass.
+  void SetCover(POpenGLTilePass& pass, std::uint32_t passIndex) const;
   // The texel format of the textures, for transfers.
   POpenGLTilePass TexelFormat(std::int32_t width, std::int32_t height) const;
   // A kept texture of the size, other than busy; given that size when none

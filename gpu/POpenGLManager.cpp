@@ -461,6 +461,15 @@ void POpenGLManager::SetShaderSizes(float texelWidth, float texelHeight, float w
                 pictureTexels[1], pictureTexels[2], pictureTexels[3]);
 }
 
+void POpenGLManager::SetShaderCover(const float circle[4], const float scale[4]) {
+  if (!shaderReady_) return;
+  const Functions& f = *functions_;
+  f.glUniform4f(f.glGetUniformLocation(shaderProgram_, "coverCircle"), circle[0], circle[1],
+                circle[2], circle[3]);
+  f.glUniform4f(f.glGetUniformLocation(shaderProgram_, "coverScale"), scale[0], scale[1], scale[2],
+                scale[3]);
+}
+
 void POpenGLManager::Shutdown() {
   // GL objects go while the context is current; the context takes the rest.
   if (renderContext_ != nullptr && (shaderReady_ || framebuffer_ != 0 || renderbuffer_ != 0)) {

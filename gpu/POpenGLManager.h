@@ -100,6 +100,10 @@ class POpenGLManager {
   void UseShader();
   void SetShaderSizes(float texelWidth, float texelHeight, float width, float height,
                       const float pictureTexels[4]);
+  // The shader's anti-aliased edge: "coverCircle" (centre x, y and radius
+  // in texels, radius 0 for none) and "coverScale" (per channel, 1 where
+  // the covered share scales it).
+  void SetShaderCover(const float circle[4], const float scale[4]);
 
  private:
   struct Functions;

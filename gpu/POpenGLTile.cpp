@@ -68,6 +68,7 @@ std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass)
       manager.SetShaderSizes(1.0f / float(pass.textureWidth), 1.0f / float(pass.textureHeight),
                              float(pass.textureWidth), float(pass.textureHeight),
                              pass.pictureTexels);
+      manager.SetShaderCover(pass.coverCircle, pass.coverScale);
     } else {
       glDisable(GL_TEXTURE_2D);
       glColor4f(1, 0, 0, 1);

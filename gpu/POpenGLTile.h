@@ -39,6 +39,11 @@ struct POpenGLTilePass {
   // The texels that hold the picture's pixels, first and last, x then y:
   // the rest is margin, where the result is transparent.
   float pictureTexels[4] = {0, 0, 0, 0};
+  // The edge of the camera model's cover as a circle in texels, centre x, y
+  // and radius (0: none), and the channels the covered share of an edge
+  // pixel scales; see the fragment shader.
+  float coverCircle[4] = {0, 0, 0, 0};
+  float coverScale[4] = {1, 1, 1, 1};
   std::uint32_t textureFormat = 0;
   std::uint32_t pixelFormat = 0;
   std::uint32_t pixelType = 0;

@@ -71,6 +71,8 @@ void ApplyLine(PSettings& settings, std::string_view line) {
   constexpr std::string_view kRegularWeight = "mesh.regular_weight=";
   constexpr std::string_view kUseTriangle = "mesh.use_triangle=";
   constexpr std::string_view kShowBehavioral = "ui.show_behavioral=";
+  constexpr std::string_view kLineWeight = "mesh.line_weight=";
+  constexpr std::string_view kConverged = "iterative.converged=";
 
   if (line.starts_with(kIterations)) {
     std::int32_t n = 0;
@@ -91,6 +93,12 @@ void ApplyLine(PSettings& settings, std::string_view line) {
     ApplySwitch(line, kUseTriangle.size(), settings.meshUseTriangle);
   } else if (line.starts_with(kShowBehavioral)) {
     ApplySwitch(line, kShowBehavioral.size(), settings.showBehavioral);
+  } else if (line.starts_with(kLineWeight)) {
+    float w = 0;
+    if (ScanFloat(value(kLineWeight), w) && w > 0.0f && w <= 1000.0f) settings.lineWeight = w;
+  } else if (line.starts_with(kConverged)) {
+    float m = 0;
+    if (ScanFloat(value(kConverged), m) && m > 0.0f && m <= 1.0f) settings.convergedMeasure = m;
   }
 }
 

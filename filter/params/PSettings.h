@@ -107,10 +107,15 @@ class PSettings {
   std::uint16_t borderExpand = 1;
   std::uint8_t regWeightApplyTo = 1;
   std::uint8_t highCenterWeight = 0;
-  float lineWeight = 10.0f;
+  // Heavier than the conformal terms by enough that each line's last sample
+  // is held as firmly as its inner ones; at 10 the ends hooked by a pixel.
+  float lineWeight = 30.0f;
   float conformalWeight = 1.0f;
   float smoothnessWeight = 3.0f;
   std::uint8_t meshUseTriangle = 1;
+  // The solve stops once the line ends moved less than this in one
+  // iteration: a squared result-plane distance summed over all ends.
+  float convergedMeasure = 0.001f;
   std::uint8_t textureRendering = 1;
   std::uint8_t showBehavioral = 0;
 

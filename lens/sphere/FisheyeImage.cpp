@@ -19,6 +19,19 @@ float FisheyeImage::Radius(float lon, float lat) const {
 
 bool FisheyeImage::Contains(float lon, float lat) const { return limitRadius_ > Radius(lon, lat); }
 
+bool FisheyeImage::Reaches(float lon, float lat) const {
+  // 2 sin(75 degrees): 150 degrees from the axis.
+  constexpr float kReach = 1.9318517f;
+  return focal_ * kReach > Radius(lon, lat);
+}
+
+bool FisheyeImage::CoverCircle(float outCentreUv[2], float& outRadius) const {
+  outCentreUv[0] = 0.5f;
+  outCentreUv[1] = 0.5f;
+  outRadius = limitRadius_;
+  return true;
+}
+
 void FisheyeImage::GetPosition(float lon, float lat, float& x, float& y) const {
   const float a = Cos(lat) * Sin(lon);
   const float b = Sin(lat);

@@ -15,6 +15,11 @@ class FisheyeImage : public PhotoToSphere {
 
   // The front half sphere: t below 90 degrees.
   bool Contains(float lon, float lat) const override;
+  // The formula holds on to the far side; a margin short of the pole
+  // behind the camera keeps the cells beyond the cover from folding.
+  bool Reaches(float lon, float lat) const override;
+  // The circle of 90 degrees, about the middle of the picture.
+  bool CoverCircle(float outCentreUv[2], float& outRadius) const override;
   void GetPosition(float lon, float lat, float& x, float& y) const override;
 
   float GetFocal() const { return focal_; }

@@ -29,6 +29,19 @@ class PhotoToSphere {
   virtual bool Contains(float lon, float lat) const = 0;
   // The centred image position of the direction, in pixels.
   virtual void GetPosition(float lon, float lat, float& x, float& y) const = 0;
+  // Whether GetPosition still gives a usable place for a direction that
+  // Contains refuses: the mesh reaches one ring of vertices past the
+  // covered directions where it can, so that the edge of the cover falls
+  // inside drawn cells and is cut there as a smooth curve.
+  virtual bool Reaches(float lon, float lat) const { return Contains(lon, lat); }
+  // The edge of the covered directions, where it is a circle in the
+  // picture: its centre as a texture coordinate and its radius in pixels of
+  // the model's image. False where the cover has no such edge.
+  virtual bool CoverCircle(float outCentreUv[2], float& outRadius) const {
+    (void)outCentreUv;
+    (void)outRadius;
+    return false;
+  }
   // Whether the mesh's vertex test walks towards the centre: false for the
   // panoramic models, whose picture need not surround the view axis.
   virtual bool WalksToCentre() const { return true; }

@@ -115,6 +115,7 @@ std::shared_ptr<SphereWarp> Solver::MakeWarp() {
   settings.latMax = latMax_;
   settings.lonMin = lonMin_;
   settings.lonMax = lonMax_;
+  settings.convergedMeasure = p.convergedMeasure;
   const LineSolveWeights weights{p.lineWeight, p.conformalWeight, p.smoothnessWeight};
   return std::make_shared<LineSolve>(octaMap_, imageModel_, lines_, settings, weights);
 }
@@ -305,6 +306,11 @@ void Solver::CollectMesh() {
     for (std::int32_t i = 0; i < cellCount_; ++i) {
       if (!IsCellVisible(i, j)) continue;
       for (int k = 0; k < 4; ++k) {
+        // The ring past the model's cover is drawn only up to the cover's
+        // edge: it does not widen the view.
+        float lat, lon;
+        octaMap_->GetDirection(i + cornerI[k], j + cornerJ[k], lat, lon);
+        if (imageModel_->WalksToCentre() && !imageModel_->Contains(lon, lat)) continue;
         const std::size_t at =
             (static_cast<std::size_t>(j + cornerJ[k]) * gridSize_ + i + cornerI[k]) * 2;
         plane.Add(positions_[at], positions_[at + 1]);

@@ -14,7 +14,6 @@ struct P2 {
 P2 Corner(const float corners[8], int k) { return {corners[2 * k], corners[2 * k + 1]}; }
 P2 Sub(P2 a, P2 b) { return {a.x - b.x, a.y - b.y}; }
 double Cross(P2 a, P2 b) { return a.x * b.y - a.y * b.x; }
-double Length2(P2 a) { return a.x * a.x + a.y * a.y; }
 
 // Barycentric weights of p in the triangle (a, b, c), taken about c.
 void Barycentric(P2 a, P2 b, P2 c, P2 p, double& wa, double& wb, double& wc) {
@@ -78,12 +77,12 @@ void BilinearWeights(const float corners[8], float x, float y, float outWeights[
   outWeights[3] = static_cast<float>((1.0 - s) * t);
 }
 
-void TriangleWeights(const float corners[8], float x, float y, float outWeights[4]) {
+void TriangleWeights(const float corners[8], float x, float y, bool mainDiagonal,
+                     float outWeights[4]) {
   const P2 p[4] = {Corner(corners, 0), Corner(corners, 1), Corner(corners, 2), Corner(corners, 3)};
   const P2 point = {x, y};
-  // Split along the longer diagonal: (p0, p1, p2) and (p0, p2, p3), or
-  // (p0, p1, p3) and (p1, p2, p3).
-  const bool alongFirst = Length2(Sub(p[0], p[2])) > Length2(Sub(p[1], p[3]));
+  // (p0, p1, p2) and (p0, p2, p3), or (p0, p1, p3) and (p1, p2, p3).
+  const bool alongFirst = mainDiagonal;
   const int third = alongFirst ? 2 : 3;
   double w0, w1, w2;
   Barycentric(p[0], p[1], p[third], point, w0, w1, w2);

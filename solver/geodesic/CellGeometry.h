@@ -17,9 +17,11 @@ bool PointInQuad(const float corners[8], float x, float y);
 // (1 - s) t.
 void BilinearWeights(const float corners[8], float x, float y, float outWeights[4]);
 
-// Barycentric weights in the cell split into two triangles along its longer
-// diagonal: three weights in the triangle that holds the point, the fourth
-// corner 0.
-void TriangleWeights(const float corners[8], float x, float y, float outWeights[4]);
+// Barycentric weights in the cell split into two triangles, along the
+// diagonal from corner 0 to corner 2 when mainDiagonal, else from corner 1
+// to corner 3 (OctaMap::SplitsAlongMainDiagonal says which): three weights
+// in the triangle that holds the point, the fourth corner 0.
+void TriangleWeights(const float corners[8], float x, float y, bool mainDiagonal,
+                     float outWeights[4]);
 
 }  // namespace Project

@@ -158,7 +158,8 @@ void GeodesicLines::CellWeights(const float point[2], Cell cell, std::int32_t mo
   float corners[8];
   GetCellCorners(cell.i, cell.j, mode, corners);
   if (useTriangles_) {
-    TriangleWeights(corners, point[0], point[1], outWeights);
+    TriangleWeights(corners, point[0], point[1], octaMap_->SplitsAlongMainDiagonal(cell.i, cell.j),
+                    outWeights);
   } else {
     BilinearWeights(corners, point[0], point[1], outWeights);
   }
@@ -235,7 +236,8 @@ LineSample GeodesicLines::EndSample(const float point[2], Cell cell, std::int32_
   float corners[8];
   GetCellCorners(cell.i, cell.j, mode, corners);
   if (triangles) {
-    TriangleWeights(corners, point[0], point[1], sample.weights.data());
+    TriangleWeights(corners, point[0], point[1], octaMap_->SplitsAlongMainDiagonal(cell.i, cell.j),
+                    sample.weights.data());
   } else {
     BilinearWeights(corners, point[0], point[1], sample.weights.data());
   }
@@ -388,9 +390,7 @@ void GeodesicLines::WalkCellsTriangles(LineRecord& line, const float from[2], co
       sample.position = static_cast<float>(1.0 - angle / total);
       return sample;
     };
-    const Vec3 d02 = corners[2] - corners[0];
-    const Vec3 d13 = corners[3] - corners[1];
-    const int d = Dot(d02, d02) > Dot(d13, d13) ? 1 : 0;
+    const int d = octaMap_->SplitsAlongMainDiagonal(cell.i, cell.j) ? 0 : 1;
     double f;
     if (CutEdge(n, corners[d], corners[d + 2] - corners[d], f)) {
       const double angle = AngleBetween(endB, corners[d] + f * (corners[d + 2] - corners[d]));

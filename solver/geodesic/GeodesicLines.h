@@ -140,7 +140,7 @@ class GeodesicLines {
 
   // The mesh point, in the mode's space, whose sphere point lies on the ray
   // from the centre through the direction, by an exhaustive scan of the
-  // mesh's cells, each split along its longer diagonal.
+  // mesh's cells, each split as OctaMap::SplitsAlongMainDiagonal says.
   bool FindSpherePoint(const float direction[3], std::int32_t mode, float outPoint[2]) const;
   // The point of the great circle through a and b nearest to point, all in
   // the mode's space, on the side of the circle nearer the ends' middle.

@@ -312,9 +312,7 @@ bool GeodesicLines::FindSpherePoint(const float direction[3], std::int32_t mode,
       for (int k = 0; k < 4; ++k) p[k] = Vec3::From(sphere + 3 * k);
       float plane[8];
       GetCellCorners(i, j, mode, plane);
-      const Vec3 d02 = p[2] - p[0];
-      const Vec3 d13 = p[3] - p[1];
-      const bool alongFirst = Dot(d02, d02) > Dot(d13, d13);
+      const bool alongFirst = octaMap_->SplitsAlongMainDiagonal(i, j);
       const int triangles[2][3] = {{0, 1, alongFirst ? 2 : 3}, {alongFirst ? 0 : 1, 2, 3}};
       for (const auto& tri : triangles) {
         // The ray from the centre against the triangle's plane, with the

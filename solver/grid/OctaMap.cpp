@@ -130,6 +130,17 @@ void OctaMap::GetPoint(std::int32_t i, std::int32_t j, float out[3]) const {
   out[2] = p[2];
 }
 
+bool OctaMap::SplitsAlongMainDiagonal(std::int32_t i, std::int32_t j) const {
+  const auto squared = [this](std::int32_t i0, std::int32_t j0, std::int32_t i1, std::int32_t j1) {
+    const float* a = &points_[(static_cast<std::size_t>(j0) * size_ + i0) * 3];
+    const float* b = &points_[(static_cast<std::size_t>(j1) * size_ + i1) * 3];
+    double sum = 0.0;
+    for (int k = 0; k < 3; ++k) sum += (double(a[k]) - b[k]) * (double(a[k]) - b[k]);
+    return sum;
+  };
+  return squared(i, j, i + 1, j + 1) <= squared(i + 1, j, i, j + 1);
+}
+
 void OctaMap::Rotate(const float in[3], float out[3]) const {
   for (int r = 0; r < 3; ++r) {
     out[r] = rotation_[r * 3] * in[0] + rotation_[r * 3 + 1] * in[1] + rotation_[r * 3 + 2] * in[2];

@@ -56,6 +56,17 @@ class OctaMap {
   };
   Cell NeighbourCell(Cell cell, std::int32_t side) const;
 
+  // The diagonal that cuts cell (i, j) into two triangles, wherever a cell
+  // is taken as triangles: traced lines, point weights and the drawn mesh
+  // all use this one, so a line straight through the traced triangles is
+  // straight through the drawn ones. It is the shorter diagonal on the
+  // sphere, the stored points deciding so that no rotation flips it. True
+  // for the main diagonal, from corner (i, j) to (i + 1, j + 1): triangles
+  // (i, j), (i + 1, j), (i + 1, j + 1) and (i, j), (i + 1, j + 1), (i, j + 1).
+  // False for the other: (i, j), (i + 1, j), (i, j + 1) and (i + 1, j),
+  // (i + 1, j + 1), (i, j + 1).
+  bool SplitsAlongMainDiagonal(std::int32_t i, std::int32_t j) const;
+
   // Directions from unit vectors, in the grid's own conventions.
   static void PointToDirection(const float p[3], float& outLat, float& outLon);
 

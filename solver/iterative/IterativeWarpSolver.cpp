@@ -14,7 +14,6 @@ namespace {
 constexpr float kLimitedSpan = 2.617994f;  // 150 degrees
 constexpr float kSeamStart = 2.792527f;    // 160 degrees
 constexpr float kTaperLat = 1.1623893f;    // 66.6 degrees
-constexpr double kConverged = 0.005;       // squared plane distance over all line ends
 
 using Clock = std::chrono::steady_clock;
 
@@ -155,27 +154,22 @@ bool IterativeWarpSolver::ComputeVertexInside(std::int32_t i, std::int32_t j, bo
   }
   const bool contained = imageModel_->Contains(lon, lat);
   if (imageModel_->WalksToCentre()) {
-    if (!contained) return false;
-    // Walk straight to the map's centre: a vertex whose path leaves the
-    // picture and comes back (the far side of a fisheye) is not mesh, and
-    // the mesh reaches borderExpand steps past the picture's edge.
-    const bool start = TexCoordInPicture(i, j);
-    const std::int32_t centre = (gridSize_ - 1) / 2;
-    bool last = start;
-    std::int32_t changes = 0, steps = 0, taken = 0;
-    std::int32_t wi = i, wj = j;
-    while (wi != centre || wj != centre) {
-      if (wi != centre) wi += wi < centre ? 1 : -1;
-      if (wj != centre) wj += wj < centre ? 1 : -1;
-      ++taken;
-      const bool here = TexCoordInPicture(wi, wj);
-      if (here != last) {
-        if (changes == 0) steps = taken;
-        ++changes;
-        last = here;
+    if (contained) return WalksInside(i, j);
+    // One ring past the cover, where the model still places the direction,
+    // so that the cover's edge runs through drawn cells.
+    if (!imageModel_->Reaches(lon, lat)) return false;
+    for (std::int32_t dj = -1; dj <= 1; ++dj) {
+      for (std::int32_t di = -1; di <= 1; ++di) {
+        const std::int32_t ni = i + di, nj = j + dj;
+        if ((di == 0 && dj == 0) || ni < 0 || nj < 0 || ni >= gridSize_ || nj >= gridSize_) {
+          continue;
+        }
+        float nLat, nLon;
+        octaMap_->GetDirection(ni, nj, nLat, nLon);
+        if (imageModel_->Contains(nLon, nLat) && WalksInside(ni, nj)) return true;
       }
     }
-    return (start && changes == 0) || (!start && changes == 1 && steps <= s.borderExpand);
+    return false;
   }
   if (contained) {
     // Panoramic models leave a contained vertex uncached.
@@ -194,6 +188,29 @@ bool IterativeWarpSolver::ComputeVertexInside(std::int32_t i, std::int32_t j, bo
     }
   }
   return false;
+}
+
+bool IterativeWarpSolver::WalksInside(std::int32_t i, std::int32_t j) const {
+  // Walk straight to the map's centre: a vertex whose path leaves the
+  // picture and comes back (the far side of a fisheye) is not mesh, and
+  // the mesh reaches borderExpand steps past the picture's edge.
+  const bool start = TexCoordInPicture(i, j);
+  const std::int32_t centre = (gridSize_ - 1) / 2;
+  bool last = start;
+  std::int32_t changes = 0, steps = 0, taken = 0;
+  std::int32_t wi = i, wj = j;
+  while (wi != centre || wj != centre) {
+    if (wi != centre) wi += wi < centre ? 1 : -1;
+    if (wj != centre) wj += wj < centre ? 1 : -1;
+    ++taken;
+    const bool here = TexCoordInPicture(wi, wj);
+    if (here != last) {
+      if (changes == 0) steps = taken;
+      ++changes;
+      last = here;
+    }
+  }
+  return (start && changes == 0) || (!start && changes == 1 && steps <= settings_.borderExpand);
 }
 
 bool IterativeWarpSolver::IsQuadInside(std::int32_t i, std::int32_t j) const {
@@ -339,7 +356,7 @@ void IterativeWarpSolver::Solve() {
     const double measure = ConvergenceMeasure();
     profile_.assemblySeconds +=
         SecondsSince(start) - stats.analyseSeconds - stats.factorSeconds - stats.solveSeconds;
-    if (measure >= 0.0 && measure < kConverged) break;
+    if (measure >= 0.0 && measure < settings_.convergedMeasure) break;
   }
 }
 

@@ -31,6 +31,8 @@ struct IterativeWarpSettings {
   float latMax = 0.0f;
   float lonMin = 0.0f;
   float lonMax = 0.0f;
+  // The iterations stop once ConvergenceMeasure falls below this.
+  double convergedMeasure = 0.001;
 };
 
 // Where the time of the solves went, summed until cleared; for benchmarks
@@ -108,7 +110,8 @@ class IterativeWarpSolver : public SphereWarp {
   virtual void AddSmoothnessVertex(std::int32_t /*i*/, std::int32_t /*j*/) {}
   virtual void AddIterationTerms(std::int32_t /*iteration*/) {}
   virtual void PrepareGaussNewton() {}
-  // Below 0: not yet measurable; the loop stops once it is below 0.005.
+  // Below 0: not yet measurable; the loop stops once it is below the
+  // settings' convergedMeasure.
   virtual double ConvergenceMeasure() { return -1.0; }
 
   // Resizes the system to unknowns, keeping what it holds.
@@ -139,6 +142,8 @@ class IterativeWarpSolver : public SphereWarp {
   bool ComputeVertexInside(std::int32_t i, std::int32_t j, bool& cache) const;
   bool InsideLimits(float lat, float lon) const;
   bool TexCoordInPicture(std::int32_t i, std::int32_t j) const;
+  // The walk to the map's centre of a vertex the model covers.
+  bool WalksInside(std::int32_t i, std::int32_t j) const;
 
   // Per vertex, index i * N + j: 0 unknown, 1 inside, 2 outside. Written
   // from the quad finder's workers too; every writer stores the same value.

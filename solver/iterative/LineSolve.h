@@ -11,7 +11,7 @@ namespace Project {
 
 // The weights of the line solve's own terms.
 struct LineSolveWeights {
-  double lineWeight = 10.0;
+  double lineWeight = 30.0;
   double conformalWeight = 1.0;
   double smoothnessWeight = 3.0;
 };

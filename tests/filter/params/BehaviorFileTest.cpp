@@ -32,6 +32,14 @@ TEST(BehaviorFile, ValuesOutOfRangeOrUnreadableChangeNothing) {
     EXPECT_EQ(Apply(line).regularWeight, 0.001f) << line;
   }
   EXPECT_EQ(Apply("mesh.regular_weight=0.0999").regularWeight, 0.0999f);
+  for (const char* line : {"mesh.line_weight=0", "mesh.line_weight=inf", "mesh.line_weight=nan",
+                           "iterative.converged=0", "iterative.converged=2"}) {
+    const PSettings s = Apply(line);
+    EXPECT_EQ(s.lineWeight, 30.0f) << line;
+    EXPECT_EQ(s.convergedMeasure, 0.001f) << line;
+  }
+  EXPECT_EQ(Apply("mesh.line_weight=10").lineWeight, 10.0f);
+  EXPECT_EQ(Apply("iterative.converged=0.005").convergedMeasure, 0.005f);
 }
 
 TEST(BehaviorFile, SwitchesTakeTrueOrFalseWithinTheLineLength) {

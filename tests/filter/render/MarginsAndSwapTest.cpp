@@ -70,11 +70,10 @@ using Margins = RenderRun;
 // At 100 % the whole mesh shows: around it the result has no cells, and its
 // outer ring of cells, one mesh step past the picture, maps outside it. The
 // photo is one bright colour, so anything of it outside the picture would be
-// the edge repeated. The bicubic kernel blends the edge into the zeros
-// around the picture over half a pixel either side, the edge itself at half
-// weight; from one and a half pixels out every fetch it weights is of the
-// zeros, so the result is exactly 0 in every plane: transparent, and black
-// where the image has no transparency.
+// the edge repeated. The picture's edge (and the fisheye's circle, where the
+// default camera's cover ends) is drawn anti-aliased: an edge pixel holds
+// its covered share, in the alpha alone where the image has transparency and
+// in every plane where it has none; past the edge every plane is exactly 0.
 TEST_F(Margins, OutsideThePictureIsZeroNotTheEdgeRepeated) {
   constexpr std::int32_t kWidth = 300, kHeight = 200;
   for (const bool transparency : {true, false}) {
@@ -93,7 +92,8 @@ TEST_F(Margins, OutsideThePictureIsZeroNotTheEdgeRepeated) {
     ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
     ASSERT_EQ(filter.Settings().imageScale, 100) << "the run took the scripted scale";
 
-    // Only the geometry is wanted: where each result pixel's source point is.
+    // Only the geometry is wanted: where each result pixel's source point is
+    // and how much of it is covered.
     const ReferenceImage reference =
         RenderReference(filter.Constraints().GetSolver(), kWidth, kHeight, 1,
                         [](std::int32_t, std::int32_t, std::int32_t) { return 1.0; });
@@ -103,41 +103,44 @@ TEST_F(Margins, OutsideThePictureIsZeroNotTheEdgeRepeated) {
       for (std::int32_t x = 0; x < kWidth; ++x) {
         const auto every = [&](auto test) {
           for (int p = 0; p < planes; ++p)
-            if (!test(document.Sample(p, x, y), inside[p])) return false;
+            if (!test(p, document.Sample(p, x, y), inside[p])) return false;
           return true;
         };
-        const auto zero = [](int value, int) { return value == 0; };
+        const auto zero = [](int, int value, int) { return value == 0; };
         if (!reference.Covered(x, y)) {
           ++bare;
           failedZero += !every(zero);
           continue;
         }
-        const double sx = reference.sourceX[reference.Index(x, y)];
-        const double sy = reference.sourceY[reference.Index(x, y)];
-        // How far outside the picture the point lies, negative inside.
-        const double out = std::max({-sx, sx - kWidth, -sy, sy - kHeight});
-        if (out >= 1.5) {
+        const double share = reference.covered[reference.Index(x, y)];
+        if (share == 0.0) {
           ++beyond;
           failedZero += !every(zero);
-        } else if (out > 0) {
+        } else if (share < 1.0) {
           ++edge;
-          // At most the half weight of the picture; one step for rounding.
-          failedEdge += !every([](int value, int full) { return value <= full / 2 + 1; });
-        } else if (out <= -1.5) {
+          // Float texture coordinates on the GPU against double here, and
+          // the rounding of the share: three steps.
+          constexpr int kSteps = 3;
+          failedEdge += !every([&](int p, int value, int full) {
+            const bool faded = !transparency || p == planes - 1;
+            return std::abs(value - (faded ? full * share : full)) <= kSteps;
+          });
+        } else {
           ++within;
           // Float rounding of weights that sum to one: one step either way.
-          failedWithin += !every([](int value, int full) { return std::abs(value - full) <= 1; });
+          failedWithin +=
+              !every([](int, int value, int full) { return std::abs(value - full) <= 1; });
         }
       }
     }
-    // The scene shows what it is for: a frame with no cells, and a ring of
-    // cells past the picture several pixels wide.
+    // The scene shows what it is for: a frame with no cells, a ring of cells
+    // past the picture and the circle several pixels wide, and an edge.
     EXPECT_GT(bare, kWidth * kHeight / 10);
     EXPECT_GT(beyond, 300);
     EXPECT_GT(edge, 300);
     EXPECT_GT(within, kWidth * kHeight / 2);
     EXPECT_EQ(failedZero, 0) << "of " << bare + beyond << " outside";
-    EXPECT_EQ(failedEdge, 0) << "of " << edge << " less than one and a half pixels out";
+    EXPECT_EQ(failedEdge, 0) << "of " << edge << " on the edge";
     EXPECT_EQ(failedWithin, 0) << "of " << within << " inside";
   }
 }

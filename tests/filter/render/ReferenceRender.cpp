@@ -2,7 +2,9 @@
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 
+#include "lens/sphere/PhotoToSphere.h"
 #include "solver/frame/Solver.h"
 
 namespace Project::testing {
@@ -41,6 +43,7 @@ ReferenceImage RenderReference(
   image.values.assign(pixels * std::size_t(planes), 0.0);
   image.sourceX.assign(pixels, NAN);
   image.sourceY.assign(pixels, NAN);
+  image.covered.assign(pixels, 0.0);
 
   // The plane's view: the fitted box about its centre, y upwards.
   const BoxFit fit = solver.FitBox(0);
@@ -73,6 +76,36 @@ ReferenceImage RenderReference(
     return std::clamp(sum, 0.0, 1.0);
   };
 
+  // The model's cover circle in source pixels, when it has one.
+  float centreUv[2], radius = 0;
+  const bool circle = solver.GetImageModel()->CoverCircle(centreUv, radius);
+  const double cx = centreUv[0] * width, cy = (1.0 - centreUv[1]) * height;
+  const double r = double(radius) * width / solver.GetImageModel()->GetImage()->width;
+  // The covered share of the pixel at source point (sx, sy), the source
+  // moving by alongX and alongY per result pixel: the distance to the
+  // nearest edge (frame or circle) in result pixels, each edge's distance
+  // over the source's step across it, plus a half, within 0..1, as the
+  // shader takes it.
+  const auto Covered = [&](double sx, double sy, std::array<double, 2> alongX,
+                           std::array<double, 2> alongY) {
+    double inside = 1e300;
+    // An edge at distance d (source pixels), (dx, dy) the unit step inwards.
+    const auto take = [&](double d, double dx, double dy) {
+      const double step =
+          std::hypot(dx * alongX[0] + dy * alongX[1], dx * alongY[0] + dy * alongY[1]);
+      inside = std::min(inside, d / std::max(step, 1e-6));
+    };
+    take(sx, 1, 0);
+    take(width - sx, -1, 0);
+    take(sy, 0, 1);
+    take(height - sy, 0, -1);
+    if (circle) {
+      const double off = std::hypot(sx - cx, sy - cy);
+      if (off > 0) take(r - off, -(sx - cx) / off, -(sy - cy) / off);
+    }
+    return std::clamp(0.5 + inside, 0.0, 1.0);
+  };
+
   const auto fill = [&](const Vertex& a, const Vertex& b, const Vertex& c) {
     const double area = (b.x - a.x) * (c.y - a.y) - (c.x - a.x) * (b.y - a.y);
     if (area == 0) return;
@@ -84,6 +117,9 @@ ReferenceImage RenderReference(
     for (std::int32_t y = y0; y <= y1; ++y) {
       for (std::int32_t x = x0; x <= x1; ++x) {
         const double px = x + 0.5, py = y + 0.5;
+        // The weights' steps per result pixel in x and in y.
+        const double dwb[2] = {(c.y - a.y) / area, (a.x - c.x) / area};
+        const double dwc[2] = {(a.y - b.y) / area, (b.x - a.x) / area};
         const double wa = ((b.x - px) * (c.y - py) - (c.x - px) * (b.y - py)) / area;
         const double wb = ((c.x - px) * (a.y - py) - (a.x - px) * (c.y - py)) / area;
         const double wc = 1.0 - wa - wb;
@@ -93,9 +129,14 @@ ReferenceImage RenderReference(
         const std::size_t at = image.Index(x, y);
         image.sourceX[at] = sx;
         image.sourceY[at] = sy;
-        const bool inside = sx >= 0 && sx <= width && sy >= 0 && sy <= height;
+        const double share = Covered(sx, sy,
+                                     {(b.u - a.u) * dwb[0] + (c.u - a.u) * dwc[0],
+                                      (b.v - a.v) * dwb[0] + (c.v - a.v) * dwc[0]},
+                                     {(b.u - a.u) * dwb[1] + (c.u - a.u) * dwc[1],
+                                      (b.v - a.v) * dwb[1] + (c.v - a.v) * dwc[1]});
+        image.covered[at] = share;
         for (std::int32_t p = 0; p < planes; ++p)
-          image.values[std::size_t(p) * pixels + at] = inside ? sample(p, sx, sy) : 0.0;
+          image.values[std::size_t(p) * pixels + at] = share > 0 ? sample(p, sx, sy) * share : 0.0;
       }
     }
   };
@@ -106,22 +147,12 @@ ReferenceImage RenderReference(
       if (!solver.IsCellInMask(i, j)) continue;
       const Vertex v00 = vertex(i, j), v10 = vertex(i + 1, j);
       const Vertex v01 = vertex(i, j + 1), v11 = vertex(i + 1, j + 1);
-      float a[3], b[3], p[3], q[3];
-      sphere.GetPoint(i, j, a);
-      sphere.GetPoint(i + 1, j + 1, b);
-      sphere.GetPoint(i + 1, j, p);
-      sphere.GetPoint(i, j + 1, q);
-      double d1 = 0, d2 = 0;
-      for (int k = 0; k < 3; ++k) {
-        d1 += double(a[k] - b[k]) * double(a[k] - b[k]);
-        d2 += double(p[k] - q[k]) * double(p[k] - q[k]);
-      }
-      if (d1 > d2) {
-        fill(v00, v01, v10);
-        fill(v01, v11, v10);
-      } else {
+      if (sphere.SplitsAlongMainDiagonal(i, j)) {
         fill(v00, v01, v11);
         fill(v00, v10, v11);
+      } else {
+        fill(v00, v01, v10);
+        fill(v01, v11, v10);
       }
     }
   }

@@ -13,10 +13,12 @@ namespace Project::testing {
 
 // The result of a solved mesh drawn on the CPU, whole, as an independent
 // answer for the tiled GPU rendering: each cell's two triangles (split along
-// the shorter diagonal on the sphere, as the program does) are rasterised at
+// the diagonal the grid names, as the program does) are rasterised at
 // pixel centres, texture coordinates are interpolated barycentrically, and
 // the source is resampled with a Catmull-Rom bicubic. Points outside the
-// picture are transparent: every plane 0.
+// picture, or past the camera model's cover circle, are transparent: every
+// plane 0; a pixel on either edge is scaled by its covered share, as the
+// shader does for a picture without transparency.
 struct ReferenceImage {
   std::int32_t width = 0;
   std::int32_t height = 0;
@@ -24,6 +26,7 @@ struct ReferenceImage {
   std::vector<double> values;   // plane-major, 0..1
   std::vector<double> sourceX;  // the source point in pixels; NaN where no cell is drawn
   std::vector<double> sourceY;
+  std::vector<double> covered;  // the share inside the picture and the cover: 1 well inside
 
   std::size_t Index(std::int32_t x, std::int32_t y) const {
     return std::size_t(y) * std::size_t(width) + std::size_t(x);

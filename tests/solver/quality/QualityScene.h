@@ -417,9 +417,9 @@ inline double PixelsPerUnit(const Solver& solver, const QualityContext& context)
 }
 
 // The photograph point's place in the result plane through the mesh as the
-// result is drawn: each cell is drawn as two triangles split along the
-// shorter of its diagonals on the sphere, and a triangle maps its texture
-// coordinates to its positions affinely.
+// result is drawn: each cell is drawn as two triangles split as the grid
+// says, and a triangle maps its texture coordinates to its positions
+// affinely.
 inline bool ResultPoint(CellLocator& locator, Synth::Point2 p, Point& out) {
   float fraction[2];
   OctaMap::Cell cell;
@@ -427,7 +427,7 @@ inline bool ResultPoint(CellLocator& locator, Synth::Point2 p, Point& out) {
   const Solver& solver = locator.solver();
   const std::int32_t n = solver.GridSize();
   const std::int32_t ci[4] = {0, 1, 1, 0}, cj[4] = {0, 0, 1, 1};
-  double tex[4][2], pos[4][2], sphere[4][3];
+  double tex[4][2], pos[4][2];
   for (int k = 0; k < 4; ++k) {
     const std::int32_t i = cell.i + ci[k], j = cell.j + cj[k];
     const std::size_t at = (static_cast<std::size_t>(j) * static_cast<std::size_t>(n) + i) * 2;
@@ -435,19 +435,10 @@ inline bool ResultPoint(CellLocator& locator, Synth::Point2 p, Point& out) {
       tex[k][d] = solver.TexCoords()[at + d];
       pos[k][d] = solver.Positions()[at + d];
     }
-    float point[3];
-    solver.GetOctaMap()->GetPoint(i, j, point);
-    for (int d = 0; d < 3; ++d) sphere[k][d] = point[d];
   }
-  auto squared = [&](int a, int b) {
-    double sum = 0.0;
-    for (int d = 0; d < 3; ++d)
-      sum += (sphere[a][d] - sphere[b][d]) * (sphere[a][d] - sphere[b][d]);
-    return sum;
-  };
   // Corners 0 to 3 are (i, j), (i + 1, j), (i + 1, j + 1), (i, j + 1).
   const int split[2][2][3] = {{{0, 3, 1}, {3, 2, 1}}, {{0, 3, 2}, {0, 1, 2}}};
-  const auto& triangles = squared(0, 2) > squared(1, 3) ? split[0] : split[1];
+  const auto& triangles = split[solver.GetOctaMap()->SplitsAlongMainDiagonal(cell.i, cell.j)];
   double best = -1e300, result[2] = {0.0, 0.0};
   for (const auto& t : triangles) {
     const double* a = tex[t[0]];
@@ -471,8 +462,7 @@ inline bool ResultPoint(CellLocator& locator, Synth::Point2 p, Point& out) {
 }
 
 // The same with the solver's own weights of the point in its cell (those of
-// its point finder, which splits a cell along its longer diagonal in the
-// photograph).
+// its point finder).
 inline bool FinderPoint(CellLocator& locator, Synth::Point2 p, Point& out) {
   float fraction[2], weights[4];
   OctaMap::Cell cell;
