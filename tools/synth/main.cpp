@@ -28,7 +28,11 @@ int main(int argc, char** argv) {
     Synth::PhotoWriter::Write(photo, line.camera, line.output);
     if (!line.truth.empty()) Synth::TruthFile::Write(photo, line.truth);
     if (!line.action.empty()) {
-      Synth::ActionWriter::Write(photo, line.camera, line.actionLines, line.action);
+      if (line.actionLines) {
+        Synth::ActionWriter::Write(photo, line.camera, *line.actionLines, line.action);
+      } else {
+        Synth::ActionWriter::Write(photo, line.scene, line.camera, line.action);
+      }
     }
   } catch (const std::exception& error) {
     std::fprintf(stderr, "archway-synth: %s\n", error.what());

@@ -41,6 +41,14 @@ TEST(CommandLine, ReadsEveryOption) {
   EXPECT_EQ(line.truth, "out.lines");
 }
 
+// Without --action-lines the action is the scene's own choice.
+TEST(CommandLine, ActionLinesOnlyWhenAsked) {
+  const CommandLine own = CommandLine::Parse({"--scene", "segments", "-o", "a.tif"});
+  EXPECT_EQ(own.scene.kind, SceneKind::kSegments);
+  EXPECT_FALSE(own.actionLines.has_value());
+  EXPECT_EQ(CommandLine::Parse({"--action-lines", "9", "-o", "a.tif"}).actionLines, 9);
+}
+
 // Cut-short and garbled command lines are refused with the fault named.
 TEST(CommandLine, NamesTheFault) {
   const struct {

@@ -67,7 +67,7 @@ CommandLine CommandLine::Parse(const std::vector<std::string>& arguments) {
       {"--scene",
        [&](const std::string&, const std::string& v) {
          if (!SceneFromName(v, &line.scene.kind)) {
-           throw SynthError("unknown scene '" + v + "' (room, facade or checker)");
+           throw SynthError("unknown scene '" + v + "' (room, facade, checker or segments)");
          }
        }},
       {"--projection",
@@ -159,7 +159,8 @@ writes it as TIFF, PNG or JPEG (by FILE's extension) with EXIF and, for
 panoramas, the panorama XMP record. With --truth it also writes the image
 curves of the scene's visible straight edges.
 
-  --scene room|facade|checker      the scene (room)
+  --scene NAME                     room (default), facade, checker or
+                                   segments
   --projection NAME                rectilinear (default), fisheye-equisolid,
                                    fisheye-equidistant, cylindrical,
                                    equirectangular, radial, tangential,
@@ -187,10 +188,15 @@ curves of the scene's visible straight edges.
                                    id x0 y0 z0 x1 y1 z1 n then n points x y
   --action FILE                    an action that corrects the photograph:
                                    its camera's model and focal length and
-                                   line constraints on the longest straight
-                                   edges, vertical ones marked vertical
+                                   line constraints on the edges a
+                                   photographer would mark (room: wall
+                                   corners, wall tops and feet, window and
+                                   door frames; segments: every bar; facade
+                                   and checker: the 6 longest), vertical
+                                   ones marked vertical, level bars level
                                    (rectilinear and fisheye-equisolid only)
-  --action-lines N                 how many edges the action holds (6)
+  --action-lines N                 instead, the N longest edges, vertical
+                                   ones marked vertical
   -h, --help                       this text
 
 An equirectangular image spans 180 degrees over its height (2:1 for the

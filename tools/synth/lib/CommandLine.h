@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -16,7 +17,8 @@ class CommandLine {
   std::string output;
   std::string truth;   // empty: no ground truth file
   std::string action;  // empty: no action file
-  int actionLines = 6;
+  // Absent: the lines the scene's own choice holds (see ActionWriter).
+  std::optional<int> actionLines;
 
   // Options take their value as the next argument or after '='. Throws
   // SynthError naming the fault.

@@ -21,12 +21,15 @@ const char* SceneName(SceneKind kind) {
       return "facade";
     case SceneKind::kChecker:
       return "checker";
+    case SceneKind::kSegments:
+      return "segments";
   }
   return "?";
 }
 
 bool SceneFromName(const std::string& name, SceneKind* kind) {
-  for (SceneKind candidate : {SceneKind::kRoom, SceneKind::kFacade, SceneKind::kChecker}) {
+  for (SceneKind candidate :
+       {SceneKind::kRoom, SceneKind::kFacade, SceneKind::kChecker, SceneKind::kSegments}) {
     if (name == SceneName(candidate)) {
       *kind = candidate;
       return true;
@@ -41,6 +44,8 @@ Scene Scene::Make(SceneKind kind) {
       return Facade();
     case SceneKind::kChecker:
       return Checker();
+    case SceneKind::kSegments:
+      return Segments();
     case SceneKind::kRoom:
       break;
   }
@@ -109,6 +114,56 @@ Scene Scene::Checker() {
   Surface board("board", {2.0, -1.5, -1.125}, kY, kZ, 3.0, 2.25, {0.92, 0.92, 0.92});
   board.SetChecker(0.25, {0.08, 0.08, 0.08});
   scene.surfaces_.push_back(board);
+  return scene;
+}
+
+Scene Scene::Segments() {
+  const Vec3 eye{0.0, 0.0, 1.6};
+  Scene scene({0.90, 0.91, 0.92}, eye);
+  // Dark blue-grey: far from the haze, and never pure black, which is what a
+  // corrected image has outside the picture.
+  const Rgb ink{0.14, 0.16, 0.22};
+  // Each bar is 0.0056 of its distance wide, about 4 to 12 pixels across in
+  // a 3000 by 2000 image from a 10 mm fisheye to a 24 mm rectilinear lens.
+  const auto add = [&](const std::string& name, const Vec3& start, const Vec3& end) {
+    const double distance = Length(0.5 * (start + end) - eye);
+    scene.surfaces_.push_back(Surface::Bar("bar." + name, start, end, 0.0056 * distance, eye, ink));
+  };
+  // The inner and middle rings lie in the plane 5 m ahead, placed by their
+  // image positions in a rectilinear view (tangents of the angle right and
+  // up): the inner ring inside a 24 mm frame, the middle one outside it but
+  // inside a 14 mm frame, so that neither straddles those frames' edges.
+  const auto ahead = [&](double right, double up) { return eye + 5.0 * Vec3{1.0, right, up}; };
+  add("centre.vertical", ahead(0.08, -0.30), ahead(0.08, 0.30));
+  add("centre.level", ahead(-0.50, 0.12), ahead(-0.05, 0.12));
+  add("low.level", ahead(0.15, -0.38), ahead(0.60, -0.38));
+  add("top.level", ahead(-0.30, 0.42), ahead(0.35, 0.42));
+  add("left.vertical", ahead(-0.66, -0.40), ahead(-0.66, 0.30));
+  add("right.vertical", ahead(0.66, -0.30), ahead(0.66, 0.40));
+  add("right.oblique", ahead(0.20, 0.00), ahead(0.55, 0.20));
+  add("left.oblique", ahead(-0.54, -0.02), ahead(-0.36, -0.37));
+  add("floor.away", eye + Vec3{2.8, -0.8, -1.3}, eye + Vec3{9.0, -0.8, -1.3});
+  add("far-left.vertical", ahead(-1.00, -0.60), ahead(-1.00, 0.50));
+  add("far-right.vertical", ahead(1.05, -0.20), ahead(1.05, 0.65));
+  add("upper.level", ahead(-0.60, 0.68), ahead(0.50, 0.68));
+  add("lower.level", ahead(-0.50, -0.66), ahead(0.70, -0.66));
+  add("upper-left.oblique", ahead(-1.18, 0.62), ahead(-0.76, 0.80));
+  add("lower-right.oblique", ahead(0.90, -0.60), ahead(1.18, -0.30));
+  // The outer ring, outside a 14 mm frame and within 64 degrees of the view
+  // axis: placed by the direction of its middle, 5 m away.
+  const auto around = [&](const std::string& name, double lonDegrees, double latDegrees,
+                          const Vec3& along, double length) {
+    constexpr double kDegree = std::numbers::pi / 180.0;
+    const Vec3 middle = eye + 5.0 * DirectionOf(lonDegrees * kDegree, latDegrees * kDegree);
+    const Vec3 half = (0.5 * length) * Normalised(along);
+    add(name, middle - half, middle + half);
+  };
+  around("zenith.level", 0, 56, kY, 2.6);
+  around("nadir.level", 5, -54, kY, 2.6);
+  around("far-left-edge.vertical", -64, 0, kZ, 3.0);
+  around("far-right-edge.vertical", 62, 6, kZ, 3.0);
+  around("top-left.oblique", -48, 40, {0.0, 1.0, 1.0}, 2.2);
+  around("bottom-right.oblique", 50, -38, {0.2, 1.0, 0.5}, 2.2);
   return scene;
 }
 

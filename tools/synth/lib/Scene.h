@@ -8,7 +8,7 @@
 
 namespace Synth {
 
-enum class SceneKind { kRoom, kFacade, kChecker };
+enum class SceneKind { kRoom, kFacade, kChecker, kSegments };
 
 // The command-line name of a scene ("room"), and back; false for an unknown
 // name.
@@ -16,13 +16,17 @@ const char* SceneName(SceneKind kind);
 bool SceneFromName(const std::string& name, SceneKind* kind);
 
 // A world of painted rectangles under a sky, rendered by casting rays. The
-// three scenes are built here with fixed sizes and colours:
+// four scenes are built here with fixed sizes and colours:
 // - room: a box 8 m deep (x), 6 m wide (y), 3 m high, every wall its own
 //   colour, a floor of 0.5 m tiles, windows with frames on the far and left
 //   walls and framed doors on the right and back walls;
 // - facade: a 28 by 16 m wall with 7 by 5 windows standing on a ground plane,
 //   turned 30 degrees from square to the unturned camera;
-// - checker: a board of 12 by 9 cells of 0.25 m, 2 m in front of the origin.
+// - checker: a board of 12 by 9 cells of 0.25 m, 2 m in front of the origin;
+// - segments: 21 dark bars hung in a light haze around a camera at (0, 0,
+//   1.6), vertical, level, oblique and running away from the view, from the
+//   middle of the view out to 64 degrees from it, each a separate blob in
+//   the image; their centrelines are the scene's only edges.
 // Neighbouring paints differ in brightness by at least 0.1, so every edge
 // shows in gray images too.
 class Scene {
@@ -44,6 +48,7 @@ class Scene {
   static Scene Room();
   static Scene Facade();
   static Scene Checker();
+  static Scene Segments();
 
   Rgb sky_;
   Vec3 defaultPosition_;

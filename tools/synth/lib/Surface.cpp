@@ -16,6 +16,19 @@ Surface::Surface(std::string name, Vec3 origin, Vec3 uAxis, Vec3 vAxis, double u
       vLength_(vLength),
       colour_(colour) {}
 
+Surface Surface::Bar(std::string name, Vec3 start, Vec3 end, double width, const Vec3& facing,
+                     Rgb colour) {
+  const Vec3 along = end - start;
+  const Vec3 sight = 0.5 * (start + end) - facing;
+  // Square to the segment and to the sight line to its middle, hence to the
+  // sight line to every point of it: the segment and that line span one plane.
+  const Vec3 across = Normalised(Cross(along, sight));
+  Surface bar(std::move(name), start - (0.5 * width) * across, Normalised(along), across,
+              Length(along), width, colour);
+  bar.bar_ = true;
+  return bar;
+}
+
 void Surface::SetChecker(double cell, Rgb other) {
   checkerCell_ = cell;
   checkerOther_ = other;
@@ -55,6 +68,10 @@ Rgb Surface::ColourAt(double u, double v) const {
 
 std::vector<Edge> Surface::Edges() const {
   std::vector<Edge> edges;
+  if (bar_) {
+    edges.push_back({name_, At(0, 0.5 * vLength_), At(uLength_, 0.5 * vLength_)});
+    return edges;
+  }
   edges.push_back({name_ + ".bottom", At(0, 0), At(uLength_, 0)});
   edges.push_back({name_ + ".right", At(uLength_, 0), At(uLength_, vLength_)});
   edges.push_back({name_ + ".top", At(uLength_, vLength_), At(0, vLength_)});

@@ -19,7 +19,9 @@ struct Edge {
 // is a base colour, optionally a checker of cells alternating with a second
 // colour, and on top rectangles of other colours (windows, doors, frames),
 // the later over the earlier. Every boundary between two paints is a straight
-// edge and is listed by Edges(), and so is the rectangle's own outline.
+// edge and is listed by Edges(), and so is the rectangle's own outline. A
+// bar is a long narrow rectangle that stands for its centreline: its edge is
+// the centreline along U, named after the bar, and nothing else.
 class Surface {
  public:
   struct Patch {
@@ -30,6 +32,12 @@ class Surface {
 
   Surface(std::string name, Vec3 origin, Vec3 uAxis, Vec3 vAxis, double uLength, double vLength,
           Rgb colour);
+
+  // A bar of the given width along the straight segment from start to end,
+  // turned about that segment to face the point `facing` (a camera's
+  // standpoint), so that its width is square to the line of sight all along.
+  static Surface Bar(std::string name, Vec3 start, Vec3 end, double width, const Vec3& facing,
+                     Rgb colour);
 
   void SetChecker(double cell, Rgb other);
   void AddPatch(Patch patch);
@@ -54,6 +62,7 @@ class Surface {
   double checkerCell_ = 0.0;
   Rgb checkerOther_;
   std::vector<Patch> patches_;
+  bool bar_ = false;
 };
 
 }  // namespace Synth
