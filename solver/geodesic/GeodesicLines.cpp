@@ -111,6 +111,18 @@ bool GeodesicLines::IsPointInCell(const float point[2], Cell cell, std::int32_t 
 }
 
 bool GeodesicLines::FindCell(const float point[2], Cell& outCell, std::int32_t mode) const {
+  if (SearchCell(point, outCell, mode)) return true;
+  // The cell test gives a point on a level edge to neither cell beside it
+  // (the equator's row of cells in the photograph is one), so such a point
+  // is looked up a hair above and below.
+  for (const float step : {kLevelNudge, -kLevelNudge}) {
+    const float nudged[2] = {point[0], point[1] + step};
+    if (SearchCell(nudged, outCell, mode)) return true;
+  }
+  return false;
+}
+
+bool GeodesicLines::SearchCell(const float point[2], Cell& outCell, std::int32_t mode) const {
   outCell = Cell{};
   const std::int32_t cells = octaMap_->Width() - 1;
   const std::int32_t rowsPerBand = cells / static_cast<std::int32_t>(kBands);
@@ -373,47 +385,69 @@ void GeodesicLines::WalkCellsTriangles(LineRecord& line, const float from[2], co
   bool walkOk = total > 0.0;
   Cell cell = cellFrom;
   double best = total;
+  // A crossing of the circle with the segment from corner k0 to k1 of the
+  // cell: its angle to the end and its sample.
+  struct Crossing {
+    double angle = 0.0;
+    bool beforeEnd = true;  // on the start's side of the end
+    LineSample sample;
+  };
+  const auto cut = [&](Cell at, const Vec3 corners[4], int k0, int k1) -> std::optional<Crossing> {
+    double f;
+    if (!CutEdge(n, corners[k0], corners[k1] - corners[k0], f)) return std::nullopt;
+    Crossing c;
+    const Vec3 point = corners[k0] + f * (corners[k1] - corners[k0]);
+    c.angle = AngleBetween(endB, point);
+    c.beforeEnd = Dot(Cross(point, endB), n) >= 0.0;
+    c.sample.cellI = at.i;
+    c.sample.cellJ = at.j;
+    c.sample.weights[static_cast<std::size_t>(k0)] = static_cast<float>(1.0 - f);
+    c.sample.weights[static_cast<std::size_t>(k1)] = static_cast<float>(f);
+    c.sample.position = static_cast<float>(1.0 - c.angle / total);
+    return c;
+  };
+  // The crossing with the cell's diagonal, when it lies strictly between
+  // two angles along the walk: a bend of the drawn line, held like the rest.
+  const auto diagonalBetween = [&](Cell at, const Vec3 corners[4], double entry, double exit) {
+    const int d = octaMap_->SplitsAlongMainDiagonal(at.i, at.j) ? 0 : 1;
+    const std::optional<Crossing> c = cut(at, corners, d, d + 2);
+    constexpr double kApart = 1e-12;  // radians: not the entry or exit itself
+    if (c && c->beforeEnd && c->angle < entry - kApart && c->angle > exit + kApart) {
+      line.samples.push_back(c->sample);
+    }
+  };
   while (walkOk && !(cell == cellTo)) {
     Vec3 corners[4];
     CellSphereCorners(cell, mode, corners);
     const bool inside = QuadInside(cell);
+    const double entry = best;
     bool moved = false;
     Cell next = cell;
-    // The crossing to keep: on the diagonal, unless an edge leads on.
-    std::optional<LineSample> candidate;
-    auto crossing = [&](int k0, int k1, double f, double angle) {
-      LineSample sample;
-      sample.cellI = cell.i;
-      sample.cellJ = cell.j;
-      sample.weights[static_cast<std::size_t>(k0)] = static_cast<float>(1.0 - f);
-      sample.weights[static_cast<std::size_t>(k1)] = static_cast<float>(f);
-      sample.position = static_cast<float>(1.0 - angle / total);
-      return sample;
-    };
-    const int d = octaMap_->SplitsAlongMainDiagonal(cell.i, cell.j) ? 0 : 1;
-    double f;
-    if (CutEdge(n, corners[d], corners[d + 2] - corners[d], f)) {
-      const double angle = AngleBetween(endB, corners[d] + f * (corners[d + 2] - corners[d]));
-      candidate = crossing(d, d + 2, f, angle);
-    }
+    std::optional<Crossing> exit;
     for (int k = 0; k < 4; ++k) {
-      const int k1 = (k + 1) % 4;
-      const Vec3 p = corners[k];
-      if (!CutEdge(n, p, corners[k1] - p, f)) continue;
-      const double angle = AngleBetween(endB, p + f * (corners[k1] - p));
-      if (angle < best + StartSlack(cell, cellFrom)) {
-        best = angle;
+      const std::optional<Crossing> c = cut(cell, corners, k, (k + 1) % 4);
+      if (c && c->angle < best + StartSlack(cell, cellFrom)) {
+        best = c->angle;
         next = octaMap_->NeighbourCell(cell, k);
         moved = true;
-        candidate = crossing(k, k1, f, angle);
+        exit = c;
       }
     }
-    if (candidate && !(cell == cellFrom)) line.samples.push_back(*candidate);
+    // Every corner of the drawn line in the cell is a sample: where it
+    // crosses the diagonal, then the edge it leaves by, so that a line held
+    // straight is drawn straight through both triangles.
+    diagonalBetween(cell, corners, entry, moved ? best : 0.0);
+    if (exit) line.samples.push_back(exit->sample);
     if (!moved || !inside) {
       walkOk = moved ? inside : true;
       break;
     }
     cell = next;
+  }
+  if (walkOk && cell == cellTo) {
+    Vec3 corners[4];
+    CellSphereCorners(cell, mode, corners);
+    diagonalBetween(cell, corners, best, 0.0);
   }
   line.samples.push_back(EndSample(to, cellTo, mode, true, 1.0f));
   line.active = walkOk;

@@ -160,6 +160,11 @@ class GeodesicLines {
   };
   Arc ArcBetween(const float from[2], const float to[2], Cell cellFrom, Cell cellTo,
                  std::int32_t mode) const;
+  // FindCell's parallel search, for one point.
+  bool SearchCell(const float point[2], Cell& outCell, std::int32_t mode) const;
+  // How far FindCell moves a point that no cell claims: some float steps of
+  // a coordinate near 1, far below a pixel of any photograph.
+  static constexpr float kLevelNudge = 1e-6f;
   // A cell's four corners on the sphere, in this mode.
   void CellSphereCorners(Cell cell, std::int32_t mode, Vec3 out[4]) const;
   bool QuadInside(Cell cell) const {

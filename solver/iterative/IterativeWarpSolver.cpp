@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <chrono>
 #include <cmath>
+#include <functional>
 #include <utility>
 
 #include "solver/sparse/SparseSolve.h"
@@ -158,24 +159,23 @@ bool IterativeWarpSolver::ComputeVertexInside(std::int32_t i, std::int32_t j, bo
     // One ring past the cover, where the model still places the direction,
     // so that the cover's edge runs through drawn cells.
     if (!imageModel_->Reaches(lon, lat)) return false;
-    for (std::int32_t dj = -1; dj <= 1; ++dj) {
-      for (std::int32_t di = -1; di <= 1; ++di) {
-        const std::int32_t ni = i + di, nj = j + dj;
-        if ((di == 0 && dj == 0) || ni < 0 || nj < 0 || ni >= gridSize_ || nj >= gridSize_) {
-          continue;
-        }
-        float nLat, nLon;
-        octaMap_->GetDirection(ni, nj, nLat, nLon);
-        if (imageModel_->Contains(nLon, nLat) && WalksInside(ni, nj)) return true;
-      }
-    }
-    return false;
+    return AnyNeighbour(i, j, [this](std::int32_t ni, std::int32_t nj, float nLat, float nLon) {
+      return imageModel_->Contains(nLon, nLat) && WalksInside(ni, nj);
+    });
   }
   if (contained) {
     // Panoramic models leave a contained vertex uncached.
     cache = false;
     return true;
   }
+  return AnyNeighbour(i, j, [this](std::int32_t, std::int32_t, float nLat, float nLon) {
+    return imageModel_->Contains(nLon, nLat);
+  });
+}
+
+bool IterativeWarpSolver::AnyNeighbour(
+    std::int32_t i, std::int32_t j,
+    const std::function<bool(std::int32_t, std::int32_t, float, float)>& test) const {
   for (std::int32_t dj = -1; dj <= 1; ++dj) {
     for (std::int32_t di = -1; di <= 1; ++di) {
       const std::int32_t ni = i + di, nj = j + dj;
@@ -184,7 +184,7 @@ bool IterativeWarpSolver::ComputeVertexInside(std::int32_t i, std::int32_t j, bo
       }
       float nLat, nLon;
       octaMap_->GetDirection(ni, nj, nLat, nLon);
-      if (imageModel_->Contains(nLon, nLat)) return true;
+      if (test(ni, nj, nLat, nLon)) return true;
     }
   }
   return false;

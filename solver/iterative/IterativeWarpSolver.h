@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -144,6 +145,11 @@ class IterativeWarpSolver : public SphereWarp {
   bool TexCoordInPicture(std::int32_t i, std::int32_t j) const;
   // The walk to the map's centre of a vertex the model covers.
   bool WalksInside(std::int32_t i, std::int32_t j) const;
+  // Whether test(i, j, lat, lon) holds for one of the up to eight grid
+  // neighbours of (i, j).
+  bool AnyNeighbour(
+      std::int32_t i, std::int32_t j,
+      const std::function<bool(std::int32_t, std::int32_t, float, float)>& test) const;
 
   // Per vertex, index i * N + j: 0 unknown, 1 inside, 2 outside. Written
   // from the quad finder's workers too; every writer stores the same value.

@@ -113,6 +113,27 @@ TEST(CellFinderTest, SharedEdgeIsClaimedOnce) {
   EXPECT_FALSE(PointInQuad(left, 0.5f, -0.01f));
 }
 
+// The cell test gives a point on a level edge to neither cell beside it.
+// The photograph's middle row is such an edge (every vertex of the equator
+// lands at v = 0.5); the finder still names a cell for points on it, one
+// that holds the point within a hair, so that a line drawn along or ending
+// on the middle row is traced.
+TEST(CellFinderTest, PointsOnALevelEdgeAreFound) {
+  GeodesicScene scene(6, false, WideFisheye());
+  const std::int32_t h = scene.map->Half();
+  float a[8];
+  scene.lines->GetCellCorners(h + 3, h, 0, a);
+  ASSERT_EQ(a[1], 0.5f) << "the equator row is level at v = 0.5";
+  for (const float s : {0.25f, 0.5f, 0.75f}) {
+    const float point[2] = {a[0] + s * (a[2] - a[0]), 0.5f};
+    ASSERT_FALSE(PointInQuad(a, point[0], point[1]));
+    Cell found;
+    ASSERT_TRUE(scene.lines->FindCell(point, found, 0)) << s;
+    EXPECT_EQ(found.i, h + 3);
+    EXPECT_TRUE(found.j == h || found.j == h - 1) << found.j;
+  }
+}
+
 // Photograph to result plane and back lands where it started.
 TEST(CellFinderTest, ResultAndSourcePointsRoundTrip) {
   GeodesicScene scene(6, false, WideFisheye());

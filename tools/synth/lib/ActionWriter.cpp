@@ -132,7 +132,7 @@ Host::Descriptor ActionWriter::Make(const RenderResult& photo, const SceneSpec& 
     } else if (!room && IsLevel(segment, photo.camera)) {
       kind = kHorizontal;
     }
-    lines.emplace_back(LineOf(segment, kind, photo.document->Width(), photo.document->Height()));
+    lines.emplace_back(LineOf(segment, kind, photo.camera.Width(), photo.camera.Height()));
   }
   return Describe(camera, lines);
 }
@@ -162,7 +162,7 @@ Host::Descriptor ActionWriter::Make(const RenderResult& photo, const CameraSpec&
   std::vector<Project::BlobRecord> lines;
   for (const TruthSegment* segment : segments) {
     lines.emplace_back(LineOf(*segment, IsVertical(*segment) ? kVertical : kUnfixed,
-                              photo.document->Width(), photo.document->Height()));
+                              photo.camera.Width(), photo.camera.Height()));
   }
   return Describe(camera, lines);
 }
