@@ -57,6 +57,21 @@ constexpr const char* kInvalidFullSphericalText =
 constexpr const char* kDialogMissingText =
     "$$$/Archway/Error/DialogMissing=This build of Archway cannot open its workspace yet.";
 
+constexpr const char* kUnusableValueText =
+    "$$$/Archway/Error/UnusableValue=The action's value ^0 for '^1' cannot be used: ^2.";
+constexpr const char* kNotANumberText = "$$$/Archway/Error/NotANumber=it is not a finite number";
+constexpr const char* kOutsideText = "$$$/Archway/Error/Outside=it must lie between ^0 and ^1";
+constexpr const char* kFocalOutsideText =
+    "$$$/Archway/Error/FocalOutside=the focal length must lie between ^0 and ^1 pixels for this "
+    "photo";
+// What a replayed crop factor and scale may be: the dialog's crop floor up
+// to a sensor a hundred times smaller than a full frame, and a result from
+// a hundredth to a hundred times the photo's size.
+constexpr float kLowestCrop = 0.1f;
+constexpr float kHighestCrop = 100.0f;
+constexpr std::int32_t kLowestScale = 1;
+constexpr std::int32_t kHighestScale = 10000;
+
 constexpr std::uint32_t kAllResetKeys =
     Tarsa::Native::kModifierControl | Tarsa::Native::kModifierAlt | Tarsa::Native::kModifierShift;
 
@@ -163,6 +178,9 @@ bool PFilter::DoStart() {
   PPreferences& preferences = Preferences();
   PSettings& settings = Settings();
   PSettings local(preferences.settings);
+  // A silent run takes nothing from the last run's photo: what its action
+  // does not say comes from this photo (ResolveUnsaid).
+  if (!IsInteractive()) local.SetDefaults();
 
   ImageHub();
   SuspendWatchCursor(true);
@@ -173,7 +191,12 @@ bool PFilter::DoStart() {
     std::intptr_t playInfo = 0;
     if (GetProperty(kPropPlayInfo, playInfo) && playInfo != 0 && ReadDescriptor(local)) {
       settings = local;
-      ResolveProjectionModel(PSettings::kModelFisheye, false, false);
+      RefuseUnusableValues();
+      if (IsInteractive()) {
+        ResolveProjectionModel(PSettings::kModelFisheye, false, false);
+      } else {
+        ResolveUnsaid(keysRead_);
+      }
       PrepareSolver();
       if (IsInteractive()) {
         LoadBehaviorFile();
@@ -193,8 +216,10 @@ bool PFilter::DoStart() {
       PrepareSolver();
       if (RunDialog()) WriteDescriptor(settings);
     } else {
+      settings = local;
       ReadDescriptor(settings);  // a descriptor that cannot be read leaves the defaults
-      ResolveProjectionModel(PSettings::kModelFisheye, false, false);
+      RefuseUnusableValues();
+      ResolveUnsaid(keysRead_);
       PrepareSolver();
       Solve();
       if (hub.RenderFinalSilent()) {
@@ -276,13 +301,62 @@ bool PFilter::RunDialog() { throw Tarsa::CError(kDialogMissingText); }
 
 // ---- Descriptor and behavioural file ---------------------------------------------------
 
+void PFilter::ResolveUnsaid(const std::vector<std::uint32_t>& said) {
+  const auto saidKey = [&](std::uint32_t key) {
+    return std::find(said.begin(), said.end(), key) != said.end();
+  };
+  PSettings& settings = Settings();
+  const bool model = saidKey(DescriptorKey::kProjectionModel);
+  const bool automatic = !model || settings.projectionModel == PSettings::kModelAuto;
+  ResolveProjectionModel(PSettings::kModelFisheye, automatic, false);
+  if (!saidKey(DescriptorKey::kFocalLength)) settings.focalLength = FocalFromMetadata(true);
+}
+
+void PFilter::RefuseUnusableValues() {
+  const PSettings& s = Settings();
+  const auto refuse = [](const char* key, double value, const Tarsa::CString& why) {
+    const Tarsa::CString text = Tarsa::ResolveText(kUnusableValueText)
+                                    .Replace(0, Tarsa::NumberToText(value, 6, false))
+                                    .Replace(1, Tarsa::CString(key))
+                                    .Replace(2, why);
+    throw Tarsa::CError(text.Str());
+  };
+  const auto finite = [&](const char* key, double value) {
+    if (!std::isfinite(value)) refuse(key, value, Tarsa::ResolveText(kNotANumberText));
+  };
+  finite("CrpF", s.cropFactor);
+  finite("PhyF", s.physicalFocal);
+  finite("focL", s.focalLength);
+  finite("imgX", s.imageCenterX);
+  finite("imgY", s.imageCenterY);
+  if (s.cropFactor < kLowestCrop || s.cropFactor > kHighestCrop) {
+    refuse("CrpF", s.cropFactor,
+           Tarsa::ResolveText(kOutsideText)
+               .Replace(0, Tarsa::NumberToText(kLowestCrop, 2, false))
+               .Replace(1, Tarsa::NumberToText(kHighestCrop, 2, false)));
+  }
+  if (s.imageScale < kLowestScale || s.imageScale > kHighestScale) {
+    refuse("imgS", s.imageScale,
+           Tarsa::ResolveText(kOutsideText)
+               .Replace(0, Tarsa::NumberToText(kLowestScale, 0, false))
+               .Replace(1, Tarsa::NumberToText(kHighestScale, 0, false)));
+  }
+  float low = 0, high = 0;
+  if (ImageFocalRange(low, high) && (s.focalLength < low || s.focalLength > high)) {
+    refuse("focL", s.focalLength,
+           Tarsa::ResolveText(kFocalOutsideText)
+               .Replace(0, Tarsa::NumberToText(low, 1, true))
+               .Replace(1, Tarsa::NumberToText(high, 1, true)));
+  }
+}
+
 bool PFilter::ReadDescriptor(PSettings& target) {
   const Tarsa::HostFilterRecord* record = FilterRecord();
   if (record == nullptr || record->scriptBlock == nullptr) return false;
   const auto* script = static_cast<const Tarsa::HostScriptBlock*>(record->scriptBlock);
   std::vector<std::uint8_t> constraintData;
-  const bool read =
-      Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target, constraintData);
+  const bool read = Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target,
+                                            constraintData, &keysRead_);
   ConstraintBlobAdapter::ReadBlob(Constraints(), constraintData.data(), constraintData.size());
   return read;
 }

@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "filter/PImageHub.h"
 #include "filter/params/PPreferences.h"
@@ -97,6 +98,16 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, priva
 
   // The scripting descriptor of the record's script block.
   bool ReadDescriptor(PSettings& target);
+  // A silent run: the model and focal length the descriptor did not give
+  // (said holds the keys it gave) come from the photo, as an interactive
+  // start takes them; an automatic model without a matching lens profile
+  // goes by the 35 mm equivalent focal length.
+  void ResolveUnsaid(const std::vector<std::uint32_t>& said);
+  // Throws the framework's error, naming the key and the value, when a
+  // replayed descriptor left a value no run can use: a number that is not
+  // finite, a focal length outside the photo's focal range, a crop factor,
+  // scale or centre out of bounds. Runs before any pixel is read.
+  void RefuseUnusableValues();
   void WriteDescriptor(const PSettings& source);
   // The behavioural parameters file over the settings.
   void LoadBehaviorFile();
@@ -155,6 +166,8 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, priva
   std::uint8_t metadataToolkitOpen_ = 0;
   const Tarsa::HostLensProfilesSuite* lensSuite_ = nullptr;
   std::unique_ptr<PLensMatcher> lensMatcher_;
+  // The keys the last ReadDescriptor found values for.
+  std::vector<std::uint32_t> keysRead_;
   float cropRatio_ = 0;
 };
 

@@ -155,8 +155,10 @@ bool ReadKey(const HostDescriptorSuite& suite, HostDescriptor d, std::uint32_t k
 }  // namespace
 
 bool ReadDescriptor(const HostDescriptorSuite* suite, Tarsa::HostHandle handle, PSettings& target,
-                    std::vector<std::uint8_t>& constraintData) {
+                    std::vector<std::uint8_t>& constraintData,
+                    std::vector<std::uint32_t>* keysRead) {
   constraintData.clear();
+  if (keysRead != nullptr) keysRead->clear();
   if (suite == nullptr || handle == nullptr) return false;
   OwnedDescriptor reader(*suite);
   if (!Call(suite->fromHandle, handle, reader.Out())) return false;
@@ -169,7 +171,11 @@ bool ReadDescriptor(const HostDescriptorSuite* suite, Tarsa::HostHandle handle, 
       succeeded = false;
       continue;
     }
-    if (!ReadKey(*suite, reader.Get(), key, target, constraintData)) succeeded = false;
+    if (!ReadKey(*suite, reader.Get(), key, target, constraintData)) {
+      succeeded = false;
+    } else if (keysRead != nullptr) {
+      keysRead->push_back(key);
+    }
   }
   return succeeded;
 }

@@ -47,9 +47,11 @@ inline constexpr std::uint32_t kAutoRegularizer = Tarsa::FourCharCode("autR");
 // descriptor's order; unknown keys are ignored. constraintData is emptied and
 // then receives the bytes under cnsD, if any. False when the suite or handle
 // is missing or any suite call failed; what was read before still stands.
-// The reader made from the handle is freed on every path.
+// The reader made from the handle is freed on every path. keysRead, when
+// given, receives the keys whose values were read.
 bool ReadDescriptor(const Tarsa::HostDescriptorSuite* suite, Tarsa::HostHandle handle,
-                    PSettings& target, std::vector<std::uint8_t>& constraintData);
+                    PSettings& target, std::vector<std::uint8_t>& constraintData,
+                    std::vector<std::uint32_t>* keysRead = nullptr);
 
 // A new descriptor of source's scripted parameters, turned into a handle for
 // the record's script block; cnsD only when constraintData is not empty.

@@ -9,6 +9,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <optional>
 #include <string>
@@ -39,14 +40,18 @@ constexpr auto kHung = std::chrono::seconds(120);
 // The program with the real module, run as a user runs it: standard input
 // empty, standard output dropped, standard error into errorFd or else into
 // a file outside every folder the tests watch. Each run reads and saves the
-// module's preferences in a fresh folder, so no run sees another's.
+// module's preferences in a fresh folder, so no run sees another's, unless
+// the changes name XDG_CONFIG_HOME.
 class ProgramRun {
  public:
   ProgramRun(const std::vector<std::string>& arguments, Environment changes, int errorFd = -1) {
     std::vector<std::string> argv = {ARCHWAY_RUNNER, arguments.front(), "--module",
                                      ARCHWAY_REAL_MODULE};
     argv.insert(argv.end(), arguments.begin() + 1, arguments.end());
-    changes.emplace_back("XDG_CONFIG_HOME", config_.Dir());
+    // Preferences in a folder of the run's own, unless the test shares one.
+    const bool shared = std::ranges::any_of(
+        changes, [](const auto& change) { return change.first == "XDG_CONFIG_HOME"; });
+    if (!shared) changes.emplace_back("XDG_CONFIG_HOME", config_.Dir());
     std::vector<std::string> envp;
     for (char** entry = environ; *entry != nullptr; ++entry) {
       const std::string text = *entry;
