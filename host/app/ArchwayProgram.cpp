@@ -1,9 +1,11 @@
 #include "host/app/ArchwayProgram.h"
 
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <memory>
 #include <optional>
+#include <string>
 
 #include "host/actions/ActionFile.h"
 #include "host/app/CommandLine.h"
@@ -49,6 +51,9 @@ constexpr const char* kUsageText =
     "  --module PATH         the module to run; else $ARCHWAY_MODULE, else\n"
     "                        Archway.so beside this program\n"
     "  --no-gpu              tell the module the graphics processor is off\n"
+    "  --timings             say where each image's time went: reading, the\n"
+    "                        module's start (metadata and solve), rendering,\n"
+    "                        writing\n"
     "  --host-version N      tell the module the host's major version is N\n"
     "                        (default 18), to check how it answers others\n"
     "  -h, --help            show this text\n"
@@ -79,6 +84,8 @@ enum class ImageResult { kDone, kFailed, kInterrupted, kStop };
 
 ImageResult CorrectImage(const CommandLine& line, PluginModule& module,
                          const std::optional<Descriptor>& action, const ImageBatch::Job& job) {
+  using Clock = std::chrono::steady_clock;
+  const Clock::time_point started = Clock::now();
   std::unique_ptr<HostDocument> document;
   try {
     document = ImageFile::Read(job.input);
@@ -114,7 +121,9 @@ ImageResult CorrectImage(const CommandLine& line, PluginModule& module,
   options.memoryOffer = HostRecord::DefaultMemoryOffer();
 
   TerminalProgress progress(FileName(job.input));
+  const Clock::time_point read = Clock::now();
   const FilterRun::Outcome outcome = FilterRun::Run(module.Entry(), *document, options, progress);
+  const Clock::time_point ran = Clock::now();
   progress.Clear();
   if (outcome.status == FilterRun::Outcome::Status::kCancelled || Interruption::Requested()) {
     Report("interrupted; '" + job.output + "' was not written");
@@ -126,6 +135,19 @@ ImageResult CorrectImage(const CommandLine& line, PluginModule& module,
   }
   try {
     ImageFile::Write(*document, job.output, format);
+    if (line.timings) {
+      // The render starts with the module's first progress report.
+      const Clock::time_point rendering = progress.FirstReport().value_or(ran);
+      const auto seconds = [](Clock::time_point from, Clock::time_point to) {
+        char text[32];
+        std::snprintf(text, sizeof text, "%.3f s",
+                      std::chrono::duration<double>(to - from).count());
+        return std::string(text);
+      };
+      Report("'" + job.input + "': read " + seconds(started, read) + ", start " +
+             seconds(read, rendering) + ", render " + seconds(rendering, ran) + ", write " +
+             seconds(ran, Clock::now()));
+    }
     if (line.saveAction) {
       if (!outcome.descriptor) {
         throw HostError(*line.saveAction, "the module left no action to save");

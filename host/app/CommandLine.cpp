@@ -62,6 +62,8 @@ CommandLine CommandLine::Parse(const std::vector<std::string>& arguments) {
       line.hostVersion = version;
     } else if (argument == "--no-gpu" && !attached) {
       line.noGraphicsProcessor = true;
+    } else if (argument == "--timings" && !attached) {
+      line.timings = true;
     } else {
       throw HostError("unknown option '" + arguments[i] + "'");
     }

@@ -17,6 +17,7 @@ class CommandLine {
   std::optional<std::string> output;
   std::optional<std::string> module;
   bool noGraphicsProcessor = false;
+  bool timings = false;
   int hostVersion = 18;
   std::vector<std::string> inputs;
 

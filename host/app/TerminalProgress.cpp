@@ -16,6 +16,7 @@ TerminalProgress::~TerminalProgress() { Clear(); }
 bool TerminalProgress::AbortRequested() { return Interruption::Requested(); }
 
 void TerminalProgress::Progress(int32_t done, int32_t total) {
+  if (!firstReport_) firstReport_ = std::chrono::steady_clock::now();
   if (!terminal_ || total <= 0) return;
   const int percent = static_cast<int>(std::clamp<int64_t>(int64_t{done} * 100 / total, 0, 100));
   if (percent == shown_) return;

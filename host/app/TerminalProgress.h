@@ -1,6 +1,8 @@
 #pragma once
 
+#include <chrono>
 #include <cstdint>
+#include <optional>
 #include <string>
 
 #include "host/plugin/RunObserver.h"
@@ -23,11 +25,16 @@ class TerminalProgress : public RunObserver {
   void Progress(int32_t done, int32_t total) override;
   // Removes the progress line, if one is shown.
   void Clear();
+  // When the first progress report came, if one did.
+  const std::optional<std::chrono::steady_clock::time_point>& FirstReport() const {
+    return firstReport_;
+  }
 
  private:
   std::string label_;
   bool terminal_;
   int shown_ = -1;
+  std::optional<std::chrono::steady_clock::time_point> firstReport_;
 };
 
 }  // namespace Host
