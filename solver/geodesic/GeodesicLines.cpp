@@ -48,10 +48,26 @@ GeodesicLines::GeodesicLines(std::shared_ptr<const OctaMap> octaMap,
                              std::shared_ptr<const PhotoToSphere> imageModel, bool useTriangles)
     : octaMap_(std::move(octaMap)),
       imageModel_(std::move(imageModel)),
-      useTriangles_(useTriangles) {}
+      useTriangles_(useTriangles) {
+  CacheTexCoords();
+}
 
 void GeodesicLines::SetImageModel(std::shared_ptr<const PhotoToSphere> imageModel) {
   imageModel_ = std::move(imageModel);
+  CacheTexCoords();
+}
+
+void GeodesicLines::CacheTexCoords() {
+  const std::int32_t n = octaMap_->Width();
+  texCoords_.assign(static_cast<std::size_t>(n) * static_cast<std::size_t>(n) * 2, 0.0f);
+  if (imageModel_ == nullptr) return;
+  for (std::int32_t j = 0; j < n; ++j) {
+    for (std::int32_t i = 0; i < n; ++i) {
+      float lat, lon;
+      octaMap_->GetDirection(i, j, lat, lon);
+      imageModel_->GetTexCoord(lon, lat, &texCoords_[(std::size_t(j) * std::size_t(n) + i) * 2]);
+    }
+  }
 }
 
 std::vector<LineRecord> GeodesicLines::CollectEdgeLines() const {
@@ -69,9 +85,9 @@ std::vector<LineRecord> GeodesicLines::CollectEdgeLines() const {
 void GeodesicLines::CornerPosition(std::int32_t i, std::int32_t j, std::int32_t mode,
                                    float out[2]) const {
   if (mode == 0) {
-    float lat, lon;
-    octaMap_->GetDirection(i, j, lat, lon);
-    imageModel_->GetTexCoord(lon, lat, out);
+    const std::size_t at = (std::size_t(j) * std::size_t(octaMap_->Width()) + std::size_t(i)) * 2;
+    out[0] = texCoords_[at];
+    out[1] = texCoords_[at + 1];
   } else if (warp_ != nullptr) {
     warp_->GetVertexPosition(i, j, out[0], out[1]);
   } else {

@@ -160,6 +160,8 @@ class GeodesicLines {
   };
   Arc ArcBetween(const float from[2], const float to[2], Cell cellFrom, Cell cellTo,
                  std::int32_t mode) const;
+  // Fills texCoords_ from the image model.
+  void CacheTexCoords();
   // FindCell's parallel search, for one point.
   bool SearchCell(const float point[2], Cell& outCell, std::int32_t mode) const;
   // How far FindCell moves a point that no cell claims: some float steps of
@@ -185,6 +187,10 @@ class GeodesicLines {
   std::shared_ptr<const PhotoToSphere> imageModel_;
   const SphereWarp* warp_ = nullptr;
   const bool useTriangles_;
+  // Every vertex's texture coordinate, two floats at (j * N + i) * 2: the
+  // cell finder and the tracing read corners in the photograph far more
+  // often than the model could be asked.
+  std::vector<float> texCoords_;
   std::vector<LineRecord> lines_;
   std::vector<PlaneRecord> planes_;
   PlaneRecord draftPlane_;

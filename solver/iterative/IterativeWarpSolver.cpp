@@ -49,7 +49,8 @@ IterativeWarpSolver::IterativeWarpSolver(std::shared_ptr<const OctaMap> octaMap,
       solution_(unknownCount_, 0.0),
       constantRhs_(unknownCount_, 0.0),
       iterationRhs_(unknownCount_, 0.0),
-      vertexState_(static_cast<std::size_t>(vertexCount_)) {
+      vertexState_(static_cast<std::size_t>(vertexCount_)),
+      pictureState_(static_cast<std::size_t>(vertexCount_)) {
   order_.cachePermutation = settings.cachePermutation;
   order_.permutation.assign(unknownCount_, 0);
 }
@@ -117,10 +118,15 @@ bool IterativeWarpSolver::InsideLimits(float lat, float lon) const {
 }
 
 bool IterativeWarpSolver::TexCoordInPicture(std::int32_t i, std::int32_t j) const {
+  std::atomic<std::uint8_t>& state = pictureState_[static_cast<std::size_t>(i) * gridSize_ + j];
+  const std::uint8_t known = state.load(std::memory_order_relaxed);
+  if (known != 0) return known == 1;
   float lat, lon, uv[2];
   octaMap_->GetDirection(i, j, lat, lon);
   imageModel_->GetTexCoord(lon, lat, uv);
-  return uv[0] >= 0.0f && uv[0] <= 1.0f && uv[1] >= 0.0f && uv[1] <= 1.0f;
+  const bool inside = uv[0] >= 0.0f && uv[0] <= 1.0f && uv[1] >= 0.0f && uv[1] <= 1.0f;
+  state.store(inside ? 1 : 2, std::memory_order_relaxed);
+  return inside;
 }
 
 bool IterativeWarpSolver::IsVertexInside(std::int32_t i, std::int32_t j) const {

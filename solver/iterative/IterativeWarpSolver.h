@@ -154,6 +154,9 @@ class IterativeWarpSolver : public SphereWarp {
   // Per vertex, index i * N + j: 0 unknown, 1 inside, 2 outside. Written
   // from the quad finder's workers too; every writer stores the same value.
   mutable std::vector<std::atomic<std::uint8_t>> vertexState_;
+  // The same for TexCoordInPicture, which every vertex's walk to the centre
+  // asks of the vertices on its way: once each, not once per walk.
+  mutable std::vector<std::atomic<std::uint8_t>> pictureState_;
 };
 
 }  // namespace Project
