@@ -3,9 +3,15 @@
 # variants: the plain one and a "_san" one built with AddressSanitizer and
 # UndefinedBehaviorSanitizer, so that one ctest run covers both.
 
+set(ARCHWAY_WARNINGS -Wall -Wextra -Werror)
 # g++ 12 at -O3 reports overlapping copies inside std::string's own inlined
-# code that cannot happen (a known false positive); it stays a warning there.
-set(ARCHWAY_WARNINGS -Wall -Wextra -Werror -Wno-error=restrict)
+# code that cannot happen (a known false positive) wherever a piece is put in
+# front of a temporary string; our code appends instead, and for that
+# compiler alone any such report stays a warning rather than an error.
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU" AND CMAKE_CXX_COMPILER_VERSION VERSION_GREATER_EQUAL 12
+   AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)
+  list(APPEND ARCHWAY_WARNINGS -Wno-error=restrict)
+endif()
 # -O1 with line tables keeps the sanitizer variant quick to build while its
 # reports still name files and lines.
 set(ARCHWAY_SAN_FLAGS -fsanitize=address,undefined -fno-sanitize-recover=all

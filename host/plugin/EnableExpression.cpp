@@ -41,8 +41,10 @@ class Scanner {
   }
 
   [[noreturn]] void Fail(const std::string& expected) const {
-    const std::string found =
-        start_ < text_.size() ? "'" + text_.substr(start_, position_ - start_) + "'" : "the end";
+    std::string found = "the end";
+    if (start_ < text_.size()) {
+      found.assign(1, '\'').append(text_, start_, position_ - start_).append(1, '\'');
+    }
     throw HostError("the enable expression \"" + text_ + "\" has " + found + " at character " +
                     std::to_string(start_ + 1) + " where " + expected + " should be");
   }

@@ -73,7 +73,7 @@ int Run(const fs::path& manifest, const fs::path& output, const fs::path& depfil
 
   Tarsa::CResourceWriter writer;
   std::string depends = DepfilePath(fs::absolute(output)) + ":";
-  depends += " " + DepfilePath(fs::absolute(manifest));
+  depends.append(1, ' ').append(DepfilePath(fs::absolute(manifest)));
   for (const auto& entry : Project::ReadManifest(manifest)) {
     const std::string where = manifest.string() + ":" + std::to_string(entry.line) + ": ";
     Bytes data;
@@ -84,7 +84,7 @@ int Run(const fs::path& manifest, const fs::path& output, const fs::path& depfil
     } else {
       const fs::path file = fs::absolute(manifest.parent_path() / entry.source);
       data = ReadFile(file);
-      depends += " " + DepfilePath(file);
+      depends.append(1, ' ').append(DepfilePath(file));
     }
     try {
       if (entry.name.empty()) {

@@ -34,7 +34,7 @@ std::string TruthFile::Format(const RenderResult& photo) {
       Append(&text, " %.9g", end.y);
       Append(&text, " %.9g", end.z);
     }
-    text += " " + std::to_string(segment.points.size());
+    text.append(1, ' ').append(std::to_string(segment.points.size()));
     for (const Point2& point : segment.points) {
       Append(&text, " %.4f", point.x);
       Append(&text, " %.4f", point.y);
