@@ -124,6 +124,24 @@ std::optional<ReferenceImage> SolveInProcess(const std::string& photoPath,
   return reference;
 }
 
+// The program's replay of an action over a photograph, with the same action
+// solved here while the program runs.
+struct Replay {
+  Descriptor action;
+  Finished run;
+  std::optional<ReferenceImage> reference;
+};
+
+Replay ReplayBeside(const std::string& input, const std::string& actionPath,
+                    const std::string& output) {
+  Replay replay{ActionFile::Read(actionPath), {}, std::nullopt};
+  ProgramRun program({"apply", "--action", actionPath, "-o", output, input}, {});
+  if (!program.Started()) return replay;
+  replay.reference = SolveInProcess(input, replay.action);
+  replay.run = program.Finish();
+  return replay;
+}
+
 // ---- The photograph and its lines -----------------------------------------------------
 
 // A constrained edge: its image curve in the photograph between the ends
@@ -278,13 +296,7 @@ TEST_F(ScriptedRoad, ConstrainedEdgesComeOutStraightAndTheResultIsTheMeshDrawn) 
   Synth::PhotoWriter::Write(generated, camera, input);
   Synth::ActionWriter::Write(generated, camera, 6, actionPath);
   const std::string before = ReadBytes(input);
-  const Descriptor action = ActionFile::Read(actionPath);
-
-  // The same action solved here while the program runs.
-  ProgramRun program({"apply", "--action", actionPath, "-o", output, input}, {});
-  ASSERT_TRUE(program.Started());
-  const std::optional<ReferenceImage> reference = SolveInProcess(input, action);
-  const Finished run = program.Finish();
+  const auto [action, run, reference] = ReplayBeside(input, actionPath, output);
   ASSERT_EQ(run.status, 0) << run.errors;
   EXPECT_EQ(run.errors, "");
   EXPECT_EQ(ReadBytes(input), before);
@@ -378,12 +390,7 @@ TEST_F(ScriptedRoad, TheSampleRoomComesOutCorrected) {
   const std::string actionPath = folder_.File("room.action");
   Synth::PhotoWriter::Write(generated, camera, input);
   Synth::ActionWriter::Write(generated, scene, camera, actionPath);
-  const Descriptor action = ActionFile::Read(actionPath);
-
-  ProgramRun program({"apply", "--action", actionPath, "-o", output, input}, {});
-  ASSERT_TRUE(program.Started());
-  const std::optional<ReferenceImage> reference = SolveInProcess(input, action);
-  const Finished run = program.Finish();
+  const auto [action, run, reference] = ReplayBeside(input, actionPath, output);
   ASSERT_EQ(run.status, 0) << run.errors;
   ASSERT_TRUE(reference.has_value());
   const auto photo = ImageFile::Read(input);
