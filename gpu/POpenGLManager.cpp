@@ -447,6 +447,15 @@ void POpenGLManager::ReleaseCurrent() {
   madeCurrent_ = false;
 }
 
+int POpenGLManager::MaxTextureSize() {
+  if (maxTextureSize_ <= 0) {
+    GLint size = 0;
+    glGetIntegerv(GL_MAX_TEXTURE_SIZE, &size);
+    maxTextureSize_ = size;
+  }
+  return maxTextureSize_;
+}
+
 void POpenGLManager::UseShader() {
   if (shaderReady_) functions_->glUseProgram(shaderProgram_);
 }

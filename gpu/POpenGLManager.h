@@ -92,6 +92,9 @@ class POpenGLManager {
   // Draws into the surface so far: a tile drawn ahead is still there to be
   // read back only while no other draw has followed it.
   std::uint64_t DrawCount() const { return drawCount_; }
+  // The largest texture side the context takes, asked once; call with the
+  // context current.
+  int MaxTextureSize();
   void CountDraw() { ++drawCount_; }
 
   // With the shader ready: use it, and set its uniforms "texelSize",
@@ -139,6 +142,7 @@ class POpenGLManager {
   std::unique_ptr<POpenGLImage> fallbackImage_;
   bool madeCurrent_ = false;
   std::uint64_t drawCount_ = 0;
+  int maxTextureSize_ = 0;  // 0 until asked
   int failureStage_ = 0;
   int windowPathStage_ = 0;
 

@@ -6,11 +6,17 @@
 #define EGL_NO_X11
 #include <GL/gl.h>
 
+#include "framework/core/CException.h"
+#include "framework/strings/CString.h"
 #include "gpu/POpenGLManager.h"
 
 namespace Project {
 
 namespace {
+
+constexpr const char* kTextureTooLargeText =
+    "$$$/Archway/Error/TextureTooLarge=This correction needs a texture of ^0 x ^1 texels, more "
+    "than the graphics processor takes (^2 on a side).";
 
 GLenum TexelType(const POpenGLTilePass& pass) {
   return pass.halfTexels ? GL_HALF_FLOAT : pass.pixelType;
@@ -56,6 +62,7 @@ std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass)
       if (pass.texture != 0) {
         glBindTexture(GL_TEXTURE_2D, pass.texture);
       } else {
+        CheckTextureSize(manager, pass);
         glGenTextures(1, &made);
         glBindTexture(GL_TEXTURE_2D, made);
         SetSampling(manager);
@@ -108,8 +115,22 @@ void ReadTilePass(const POpenGLTilePass& pass, std::uint32_t madeTexture) {
   glDisable(GL_TEXTURE_2D);
 }
 
+void CheckTextureSize(POpenGLManager& manager, const POpenGLTilePass& pass) {
+  const int most = manager.MaxTextureSize();
+  if (pass.textureWidth > 0 && pass.textureHeight > 0 && pass.textureWidth <= most &&
+      pass.textureHeight <= most) {
+    return;
+  }
+  const Tarsa::CString text = Tarsa::ResolveText(kTextureTooLargeText)
+                                  .Replace(0, Tarsa::NumberToText(pass.textureWidth, 0, false))
+                                  .Replace(1, Tarsa::NumberToText(pass.textureHeight, 0, false))
+                                  .Replace(2, Tarsa::NumberToText(most, 0, false));
+  throw Tarsa::CError(text.Str());
+}
+
 void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
                        const POpenGLTilePass& pass) {
+  CheckTextureSize(manager, pass);
   if (texture == 0) {
     GLuint name = 0;
     glGenTextures(1, &name);

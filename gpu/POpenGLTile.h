@@ -81,6 +81,10 @@ void ReadTilePass(const POpenGLTilePass& pass, std::uint32_t madeTexture);
 // formats and sampling, its texels undefined until filled. FillTileTexture
 // writes width x height texels at (x, y) from texels, whose rows lie
 // rowLength texels apart, of the pass's type.
+// Throws the framework's error when the pass's texture is empty or larger on
+// a side than the context takes: no mesh, however it came out, hands the GL
+// a size beyond its limits. DrawTilePass and DefineTileTexture check.
+void CheckTextureSize(POpenGLManager& manager, const POpenGLTilePass& pass);
 void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
                        const POpenGLTilePass& pass);
 void FillTileTexture(std::uint32_t texture, const POpenGLTilePass& pass, int x, int y, int width,

@@ -5,6 +5,8 @@
 #include <filesystem>
 #include <string>
 
+#include "framework/core/CException.h"
+#include "gpu/POpenGLTile.h"
 #include "tests/gpu/GpuTestSupport.h"
 #include "tests/support/TestSupport.h"
 
@@ -52,6 +54,38 @@ TEST(POpenGLManager, FramebufferPathRendersIntoItsSurface) {
     manager.ReleaseCurrent();
     EXPECT_EQ(eglGetCurrentContext(), EGL_NO_CONTEXT);
   }
+}
+
+// A texture larger on a side than the context takes, or an empty one, is
+// refused in words before the GL is asked for it; one at the limit is made.
+TEST(POpenGLManager, TexturesBeyondTheContextsLimitAreRefused) {
+  POpenGLManager manager(GL_RGBA8);
+  ASSERT_TRUE(manager.Initialize());
+  manager.MakeCurrent();
+  const int most = manager.MaxTextureSize();
+  ASSERT_GE(most, 1024);  // what any OpenGL 2.1 context offers
+  POpenGLTilePass pass;
+  pass.textureFormat = GL_RGBA8;
+  pass.pixelFormat = GL_RGBA;
+  pass.pixelType = GL_UNSIGNED_BYTE;
+  for (const auto& [width, height] : {std::pair{most + 1, 1}, {1, most + 1}, {0, 16}, {16, -1}}) {
+    SCOPED_TRACE(::testing::Message() << width << " x " << height);
+    pass.textureWidth = width;
+    pass.textureHeight = height;
+    std::uint32_t texture = 0;
+    EXPECT_THROW(DefineTileTexture(manager, texture, pass), Tarsa::CError);
+    EXPECT_EQ(texture, 0u);
+  }
+  EXPECT_EQ(glGetError(), GLenum(GL_NO_ERROR));
+  pass.textureWidth = most;
+  pass.textureHeight = 1;
+  std::uint32_t texture = 0;
+  EXPECT_NO_THROW(DefineTileTexture(manager, texture, pass));
+  EXPECT_NE(texture, 0u);
+  const GLuint name = texture;
+  glDeleteTextures(1, &name);
+  EXPECT_EQ(glGetError(), GLenum(GL_NO_ERROR));
+  manager.ReleaseCurrent();
 }
 
 TEST(POpenGLManager, MissingFramebufferFunctionFallsBackToAPixelBuffer) {
