@@ -309,7 +309,17 @@ void PFilter::ResolveUnsaid(const std::vector<std::uint32_t>& said) {
   const bool model = saidKey(DescriptorKey::kProjectionModel);
   const bool automatic = !model || settings.projectionModel == PSettings::kModelAuto;
   ResolveProjectionModel(PSettings::kModelFisheye, automatic, false);
-  if (!saidKey(DescriptorKey::kFocalLength)) settings.focalLength = FocalFromMetadata(true);
+  if (saidKey(DescriptorKey::kFocalLength)) return;
+  settings.focalLength = FocalFromMetadata(true);
+  // A matched lens profile renders at its own focal length, which the saved
+  // action then records: the geometric mean of its two, in pixels of the
+  // longer side, as the profile's sphere model takes them.
+  const PGenericCameraModel* camera = settings.lensRecord.GetCameraModel();
+  if (settings.projectionModel == PSettings::kModelAuto && camera != nullptr) {
+    const float crop = GetCropRatio();
+    settings.focalLength =
+        std::sqrt(camera->focalX * crop * camera->focalY * crop) * float(LargerSide());
+  }
 }
 
 void PFilter::RefuseUnusableValues() {

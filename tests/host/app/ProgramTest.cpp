@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 
+#include <cmath>
 #include <cstdlib>
 #include <filesystem>
 #include <string>
@@ -268,8 +269,8 @@ TEST_F(ProgramTest, TheRealModuleIsReachedForEveryKindOfFile) {
     EXPECT_EQ(ReadBytes(input), before[i]);
   }
 }
-// A scripted run resolves the projection model by the module's rules, and
-// the descriptor the host saves shows it: Auto stays Auto when a shipped
+// A scripted run resolves the projection model (and the focal length) by
+// the module's rules, and the descriptor the host saves shows it: Auto stays Auto when a shipped
 // lens profile matches the photo's camera and lens, or when the photo is a
 // panorama with its own record; with neither it falls back to fisheye. Full
 // Spherical holds on a 2:1 picture and falls back on any other.
@@ -322,6 +323,15 @@ TEST_F(ProgramTest, ScriptedRunsResolveTheProjectionModel) {
     const auto* model = descriptor.Find(FourCC("prjM"));
     ASSERT_NE(model, nullptr);
     EXPECT_EQ(model->enumValue, c.resolved);
+    // The focal length the run rendered at: the lens profile's own, else the
+    // metadata's, both the generator's 8 mm over the frame's diagonal. A
+    // panorama's comes from its own record.
+    const auto* focal = descriptor.Find(FourCC("focL"));
+    ASSERT_NE(focal, nullptr);
+    if (c.projection == Synth::ProjectionKind::kFisheyeEquisolid) {
+      const double truth = 8.0 * std::hypot(c.width, c.height) / std::hypot(36.0, 24.0);
+      EXPECT_NEAR(focal->number, truth, 1e-3);  // single precision in the module
+    }
   }
 }
 #endif
