@@ -290,12 +290,14 @@ void IterativeWarpSolver::AssembleConstantPart() {
     if (constantBuilder_.RowEntryCount(r) == 0) constantBuilder_.Set(r, r, 1.0);
   }
   constantMatrix_ = std::make_unique<CompressedMatrix>(constantBuilder_);
+  constantAssembled_ = true;
   profile_.constantSeconds += SecondsSince(start);
 }
 
-void IterativeWarpSolver::Reset() { AssembleConstantPart(); }
+void IterativeWarpSolver::Reset() { constantAssembled_ = false; }
 
 void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
+  EnsureConstantPart();
   unknownCount_ = unknowns;
   solution_.resize(unknowns, 0.0);
   constantRhs_.resize(unknowns, 0.0);
@@ -308,6 +310,7 @@ void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
 }
 
 void IterativeWarpSolver::Solve() {
+  EnsureConstantPart();
   Clock::time_point start = Clock::now();
   if (settings_.useGaussNewton) PrepareGaussNewton();
   profile_.prepareSeconds += SecondsSince(start);
@@ -366,7 +369,8 @@ void IterativeWarpSolver::Solve() {
   }
 }
 
-double IterativeWarpSolver::TotalEnergy() const {
+double IterativeWarpSolver::TotalEnergy() {
+  EnsureConstantPart();
   std::vector<double> product(unknownCount_);
   constantMatrix_->MultiplySymmetric(solution_, product);
   double energy = 0.0;

@@ -84,13 +84,19 @@ class IterativeWarpSolver : public SphereWarp {
 
   // Reporting aids: the anchors' energy at the current solution, and the
   // constraint terms' (zero here).
-  virtual double TotalEnergy() const;
+  virtual double TotalEnergy();
   virtual double ConstraintEnergy() const { return 0.0; }
 
   const std::vector<double>& Solution() const { return solution_; }
   std::int32_t UnknownCount() const { return unknownCount_; }
-  const CompressedMatrix& ConstantMatrix() const { return *constantMatrix_; }
-  const std::vector<double>& ConstantRhs() const { return constantRhs_; }
+  const CompressedMatrix& ConstantMatrix() {
+    EnsureConstantPart();
+    return *constantMatrix_;
+  }
+  const std::vector<double>& ConstantRhs() {
+    EnsureConstantPart();
+    return constantRhs_;
+  }
   const EliminationOrder& Order() const { return order_; }
   // Solves done by the last Solve(), for the benchmarks and tests.
   std::int32_t IterationsRun() const { return iterationsRun_; }
@@ -98,8 +104,13 @@ class IterativeWarpSolver : public SphereWarp {
   void ClearProfile() { profile_ = SolveProfile{}; }
 
  protected:
-  // The constant part; subclasses call it once their own fields are set,
-  // since it reaches their terms.
+  // The constant part, assembled when first needed (a solve, the accessors):
+  // a warp built only to measure the mesh's extents, or replaced before it
+  // solves, never assembles it. Subclasses' terms take part, so it waits
+  // for their fields too.
+  void EnsureConstantPart() {
+    if (!constantAssembled_) AssembleConstantPart();
+  }
   void AssembleConstantPart();
   // A least-squares row with coefficients c on unknowns q and residual r:
   // its normal-equation entries go to builder (upper triangle) and, when rhs
@@ -157,6 +168,7 @@ class IterativeWarpSolver : public SphereWarp {
   // The same for TexCoordInPicture, which every vertex's walk to the centre
   // asks of the vertices on its way: once each, not once per walk.
   mutable std::vector<std::atomic<std::uint8_t>> pictureState_;
+  bool constantAssembled_ = false;
 };
 
 }  // namespace Project

@@ -18,9 +18,7 @@ LineSolve::LineSolve(std::shared_ptr<const OctaMap> octaMap,
                      const LineSolveWeights& weights)
     : IterativeWarpSolver(std::move(octaMap), std::move(imageModel), settings),
       lines_(std::move(lines)),
-      weights_(weights) {
-  AssembleConstantPart();
-}
+      weights_(weights) {}
 
 void LineSolve::AddSimilarityRows(double weight, Vertex a, Vertex b, Vertex c) {
   float pa[3], pb[3], pc[3], east[3], north[3];

@@ -149,7 +149,7 @@ TEST(LineSolve, AnchorVariants) {
   const auto whole = scene.Make();
   scene.settings.highCenterWeight = true;
   const auto centre = scene.Make();
-  auto diagonal = [](const IterativeWarpSolver& s, int k) {
+  auto diagonal = [](IterativeWarpSolver& s, int k) {
     const CompressedMatrix& a = s.ConstantMatrix();
     return a.Value()[a.RowStart()[k] - 1];  // the diagonal leads its row
   };
