@@ -82,10 +82,10 @@ struct Scene {
     camera.focalMm = 10.0;
     camera.width = kWidth;
     camera.height = kHeight;
-    const Synth::SceneSpec spec{Synth::SceneKind::kSegments};
-    const Synth::RenderResult generated = Synth::Render(spec, camera);
+    const Synth::SceneSpec bars{Synth::SceneKind::kSegments};
+    const Synth::RenderResult generated = Synth::Render(bars, camera);
     Synth::PhotoWriter::Write(generated, camera, photo);
-    Synth::ActionWriter::Write(generated, spec, camera, action);
+    Synth::ActionWriter::Write(generated, bars, camera, action);
     // The photo as a full-frame fisheye of 180 degrees, remapped to a
     // rectilinear picture of its own size: one pass over every pixel.
     std::ofstream pto(project);

@@ -339,24 +339,21 @@ void PFilter::RefuseUnusableValues() {
   finite("focL", s.focalLength);
   finite("imgX", s.imageCenterX);
   finite("imgY", s.imageCenterY);
-  if (s.cropFactor < kLowestCrop || s.cropFactor > kHighestCrop) {
-    refuse("CrpF", s.cropFactor,
-           Tarsa::ResolveText(kOutsideText)
-               .Replace(0, Tarsa::NumberToText(kLowestCrop, 2, false))
-               .Replace(1, Tarsa::NumberToText(kHighestCrop, 2, false)));
-  }
-  if (s.imageScale < kLowestScale || s.imageScale > kHighestScale) {
-    refuse("imgS", s.imageScale,
-           Tarsa::ResolveText(kOutsideText)
-               .Replace(0, Tarsa::NumberToText(kLowestScale, 0, false))
-               .Replace(1, Tarsa::NumberToText(kHighestScale, 0, false)));
-  }
+  // A value outside low..high, the bounds shown to `digits` decimals, all
+  // of them when fixed.
+  const auto within = [&](const char* key, double value, double low, double high, int digits,
+                          bool fixed, const char* why) {
+    if (value >= low && value <= high) return;
+    refuse(key, value,
+           Tarsa::ResolveText(why)
+               .Replace(0, Tarsa::NumberToText(low, digits, fixed))
+               .Replace(1, Tarsa::NumberToText(high, digits, fixed)));
+  };
+  within("CrpF", s.cropFactor, kLowestCrop, kHighestCrop, 2, false, kOutsideText);
+  within("imgS", s.imageScale, kLowestScale, kHighestScale, 0, false, kOutsideText);
   float low = 0, high = 0;
-  if (ImageFocalRange(low, high) && (s.focalLength < low || s.focalLength > high)) {
-    refuse("focL", s.focalLength,
-           Tarsa::ResolveText(kFocalOutsideText)
-               .Replace(0, Tarsa::NumberToText(low, 1, true))
-               .Replace(1, Tarsa::NumberToText(high, 1, true)));
+  if (ImageFocalRange(low, high)) {
+    within("focL", s.focalLength, low, high, 1, true, kFocalOutsideText);
   }
 }
 

@@ -185,13 +185,17 @@ void Solver::UpdateConstraintDisplays(std::int32_t constraintId) {
 }
 
 void Solver::LoadTexCoords() {
+  covered_.assign(static_cast<std::size_t>(gridSize_) * gridSize_, 0);
   for (std::int32_t j = 0; j < gridSize_; ++j) {
     for (std::int32_t i = 0; i < gridSize_; ++i) {
       if (!warp_->IsVertexInside(i, j)) continue;
+      const std::size_t at = static_cast<std::size_t>(j) * gridSize_ + i;
+      lines_->TexCoord(i, j, &texCoords_[at * 2]);
+      // The ring past the model's cover is drawn only up to the cover's
+      // edge: it does not widen the view.
       float lat, lon;
       octaMap_->GetDirection(i, j, lat, lon);
-      imageModel_->GetTexCoord(lon, lat,
-                               &texCoords_[(static_cast<std::size_t>(j) * gridSize_ + i) * 2]);
+      covered_[at] = !imageModel_->WalksToCentre() || imageModel_->Contains(lon, lat) ? 1 : 0;
     }
   }
   for (std::int32_t j = 0; j < cellCount_; ++j) {
@@ -295,9 +299,7 @@ void Solver::CollectMesh() {
       if (!warp_->IsVertexInside(i, j)) continue;
       const std::size_t at = (static_cast<std::size_t>(j) * gridSize_ + i) * 2;
       warp_->GetVertexPosition(i, j, positions_[at], positions_[at + 1]);
-      float lat, lon;
-      octaMap_->GetDirection(i, j, lat, lon);
-      imageModel_->GetTexCoord(lon, lat, &texCoords_[at]);
+      lines_->TexCoord(i, j, &texCoords_[at]);
     }
   }
   Extent plane, texture;
@@ -306,13 +308,10 @@ void Solver::CollectMesh() {
     for (std::int32_t i = 0; i < cellCount_; ++i) {
       if (!IsCellVisible(i, j)) continue;
       for (int k = 0; k < 4; ++k) {
-        // The ring past the model's cover is drawn only up to the cover's
-        // edge: it does not widen the view.
-        float lat, lon;
-        octaMap_->GetDirection(i + cornerI[k], j + cornerJ[k], lat, lon);
-        if (imageModel_->WalksToCentre() && !imageModel_->Contains(lon, lat)) continue;
-        const std::size_t at =
-            (static_cast<std::size_t>(j + cornerJ[k]) * gridSize_ + i + cornerI[k]) * 2;
+        const std::size_t vertex =
+            static_cast<std::size_t>(j + cornerJ[k]) * gridSize_ + i + cornerI[k];
+        if (covered_[vertex] == 0) continue;
+        const std::size_t at = vertex * 2;
         plane.Add(positions_[at], positions_[at + 1]);
         texture.Add(texCoords_[at], texCoords_[at + 1]);
       }

@@ -150,6 +150,9 @@ class Solver {
   ViewBox fullBox_;
   float centerLimits_[4] = {0, 0, 1, 1};
   std::vector<std::uint8_t> cellMask_;
+  // Per vertex: whether the model covers its direction (the mesh may reach
+  // a ring past that), as of the last LoadTexCoords.
+  std::vector<std::uint8_t> covered_;
   bool isWide_ = false;
   std::int32_t warpModel_ = 3;
   bool userChanged_ = false;

@@ -85,9 +85,7 @@ std::vector<LineRecord> GeodesicLines::CollectEdgeLines() const {
 void GeodesicLines::CornerPosition(std::int32_t i, std::int32_t j, std::int32_t mode,
                                    float out[2]) const {
   if (mode == 0) {
-    const std::size_t at = (std::size_t(j) * std::size_t(octaMap_->Width()) + std::size_t(i)) * 2;
-    out[0] = texCoords_[at];
-    out[1] = texCoords_[at + 1];
+    TexCoord(i, j, out);
   } else if (warp_ != nullptr) {
     warp_->GetVertexPosition(i, j, out[0], out[1]);
   } else {

@@ -66,6 +66,13 @@ class GeodesicLines {
 
   // --- Cells and points ---
 
+  // The texture coordinate of vertex (i, j)'s stored direction, worked out
+  // once per image model.
+  void TexCoord(std::int32_t i, std::int32_t j, float out[2]) const {
+    const std::size_t at = (std::size_t(j) * std::size_t(octaMap_->Width()) + std::size_t(i)) * 2;
+    out[0] = texCoords_[at];
+    out[1] = texCoords_[at + 1];
+  }
   // The four corners of cell (i, j) in the mode's space, x0, y0 to x3, y3.
   void GetCellCorners(std::int32_t i, std::int32_t j, std::int32_t mode, float out[8]) const;
   // The corners' sphere points, in the same order.

@@ -86,8 +86,8 @@ ReferenceImage RenderReference(
   // nearest edge (frame or circle) in result pixels, each edge's distance
   // over the source's step across it, plus a half, within 0..1, as the
   // shader takes it.
-  const auto Covered = [&](double sx, double sy, std::array<double, 2> alongX,
-                           std::array<double, 2> alongY) {
+  const auto coveredShare = [&](double sx, double sy, std::array<double, 2> alongX,
+                                std::array<double, 2> alongY) {
     double inside = 1e300;
     // An edge at distance d (source pixels), (dx, dy) the unit step inwards.
     const auto take = [&](double d, double dx, double dy) {
@@ -129,11 +129,11 @@ ReferenceImage RenderReference(
         const std::size_t at = image.Index(x, y);
         image.sourceX[at] = sx;
         image.sourceY[at] = sy;
-        const double share = Covered(sx, sy,
-                                     {(b.u - a.u) * dwb[0] + (c.u - a.u) * dwc[0],
-                                      (b.v - a.v) * dwb[0] + (c.v - a.v) * dwc[0]},
-                                     {(b.u - a.u) * dwb[1] + (c.u - a.u) * dwc[1],
-                                      (b.v - a.v) * dwb[1] + (c.v - a.v) * dwc[1]});
+        const double share = coveredShare(sx, sy,
+                                          {(b.u - a.u) * dwb[0] + (c.u - a.u) * dwc[0],
+                                           (b.v - a.v) * dwb[0] + (c.v - a.v) * dwc[0]},
+                                          {(b.u - a.u) * dwb[1] + (c.u - a.u) * dwc[1],
+                                           (b.v - a.v) * dwb[1] + (c.v - a.v) * dwc[1]});
         image.covered[at] = share;
         for (std::int32_t p = 0; p < planes; ++p)
           image.values[std::size_t(p) * pixels + at] = share > 0 ? sample(p, sx, sy) * share : 0.0;

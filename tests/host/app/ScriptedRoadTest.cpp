@@ -275,6 +275,16 @@ Probe ProbeEdge(
 
 // ---- Tests -------------------------------------------------------------------------------
 
+// The README sample's lens: a 10 mm equisolid fisheye on a full frame.
+Synth::CameraSpec Fisheye10(int width, int height) {
+  Synth::CameraSpec camera;
+  camera.projection = Synth::ProjectionKind::kFisheyeEquisolid;
+  camera.focalMm = 10.0;
+  camera.width = width;
+  camera.height = height;
+  return camera;
+}
+
 class ScriptedRoad : public ::testing::Test {
  protected:
   ScratchFolder folder_;
@@ -285,11 +295,7 @@ class ScriptedRoad : public ::testing::Test {
 // mesh the same action solves to, drawn on the CPU, and by its own pixels,
 // where each constrained edge must lie straight.
 TEST_F(ScriptedRoad, ConstrainedEdgesComeOutStraightAndTheResultIsTheMeshDrawn) {
-  Synth::CameraSpec camera;
-  camera.projection = Synth::ProjectionKind::kFisheyeEquisolid;
-  camera.focalMm = 10.0;
-  camera.width = 480;
-  camera.height = 320;
+  const Synth::CameraSpec camera = Fisheye10(480, 320);
   const Synth::RenderResult generated = Synth::Render({Synth::SceneKind::kRoom}, camera);
   const std::string input = folder_.File("room.tif"), output = folder_.File("out.tif");
   const std::string actionPath = folder_.File("room.action");
@@ -379,11 +385,7 @@ TEST_F(ScriptedRoad, ConstrainedEdgesComeOutStraightAndTheResultIsTheMeshDrawn) 
 // and feet, the window and door frames). Every plumb edge comes out within
 // a tenth of a degree of vertical and every constrained edge straight.
 TEST_F(ScriptedRoad, TheSampleRoomComesOutCorrected) {
-  Synth::CameraSpec camera;
-  camera.projection = Synth::ProjectionKind::kFisheyeEquisolid;
-  camera.focalMm = 10.0;
-  camera.width = 1800;
-  camera.height = 1200;
+  const Synth::CameraSpec camera = Fisheye10(1800, 1200);
   const Synth::SceneSpec scene{Synth::SceneKind::kRoom};
   const Synth::RenderResult generated = Synth::Render(scene, camera);
   const std::string input = folder_.File("room.tif"), output = folder_.File("room-out.tif");

@@ -27,9 +27,9 @@ CameraSpec Lens(ProjectionKind projection, double focalMm, int width = 3000, int
 }
 
 // The truth alone, without the picture: enough for where edges fall.
-RenderResult Trace(SceneKind kind, const CameraSpec& spec) {
+RenderResult Trace(SceneKind kind, const CameraSpec& lens) {
   const Scene scene = Scene::Make(kind);
-  RenderResult photo{nullptr, {}, MakeCamera(scene, spec)};
+  RenderResult photo{nullptr, {}, MakeCamera(scene, lens)};
   photo.truth = TruthTracer(scene, photo.camera).Trace();
   return photo;
 }
