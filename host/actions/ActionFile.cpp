@@ -146,7 +146,7 @@ std::string ActionFile::Format(const Descriptor& descriptor) {
   return text;
 }
 
-Descriptor ActionFile::Parse(std::string_view text) {
+Descriptor ActionFile::Parse(std::string_view text, const ActionTerms* terms) {
   Descriptor descriptor;
   size_t number = 0;
   bool header = false;
@@ -198,13 +198,17 @@ Descriptor ActionFile::Parse(std::string_view text) {
       line.Fail("unknown type '" + std::string(type) +
                 "' (expected integer, float, enumerated or data)");
     }
+    if (terms != nullptr) {
+      const std::string refusal = terms->Refusal(*descriptor.Find(key));
+      if (!refusal.empty()) line.Fail(refusal);
+    }
   }
   if (!header)
     throw HostError("the file is empty; an action file starts with '" + std::string(kHeader) + "'");
   return descriptor;
 }
 
-Descriptor ActionFile::Read(const std::string& path) {
+Descriptor ActionFile::Read(const std::string& path, const ActionTerms* terms) {
   std::error_code ignored;
   if (std::filesystem::is_directory(path, ignored)) {
     throw HostError(path, "is a folder, not an action file");
@@ -219,7 +223,7 @@ Descriptor ActionFile::Read(const std::string& path) {
   if (contents.size() > kLargestFile)
     throw HostError(path, "the file is too large to be an action");
   try {
-    return Parse(contents);
+    return Parse(contents, terms);
   } catch (const HostError& error) {
     throw HostError(path, error.Problem());
   }

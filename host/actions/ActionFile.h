@@ -3,6 +3,7 @@
 #include <string>
 #include <string_view>
 
+#include "host/actions/ActionTerms.h"
 #include "host/plugin/Descriptor.h"
 
 namespace Host {
@@ -21,21 +22,23 @@ namespace Host {
 // hex digits when a character is not printable. Floats are written in the
 // shortest form that reads back to the same double, so a file written from a
 // descriptor reads back to an equal one. Reading is strict and names the line
-// of any fault. Operations only.
+// of any fault, a value the module's terminology refuses included. Operations
+// only.
 class ActionFile {
  public:
   static constexpr const char* kHeader = "archway-action 1";
 
   ActionFile() = delete;
 
-  // Throws HostError naming the file, and the line when its text is at fault.
-  static Descriptor Read(const std::string& path);
+  // Throws HostError naming the file, and the line when its text is at fault
+  // or `terms` (when given) refuse one of its values.
+  static Descriptor Read(const std::string& path, const ActionTerms* terms = nullptr);
   // Written whole under a temporary name, then renamed; throws HostError.
   static void Write(const Descriptor& descriptor, const std::string& path);
 
   static std::string Format(const Descriptor& descriptor);
   // Throws HostError("line N: ...") for text that is not an action.
-  static Descriptor Parse(std::string_view text);
+  static Descriptor Parse(std::string_view text, const ActionTerms* terms = nullptr);
 };
 
 }  // namespace Host

@@ -193,8 +193,12 @@ int ArchwayProgram::Run(const std::vector<std::string>& arguments) {
       throw HostError(*line.saveAction,
                       "--save-action takes one image, not " + std::to_string(jobs.size()));
     }
-    if (line.action) action = ActionFile::Read(*line.action);
     module = PluginModule::Inspect(ModulePath(line));
+    if (line.action) {
+      std::optional<ActionTerms> terms;
+      if (module->Terminology() != nullptr) terms.emplace(*module->Terminology());
+      action = ActionFile::Read(*line.action, terms ? &*terms : nullptr);
+    }
   } catch (const HostError& error) {
     Report(error.what());
     return kFailed;

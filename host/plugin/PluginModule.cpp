@@ -20,20 +20,24 @@ std::string DefaultText(const std::string& keyed) {
 
 }  // namespace
 
-PluginModule::PluginModule(std::string path, EnableExpression enabled)
-    : path_(std::move(path)), enabled_(enabled) {}
+PluginModule::PluginModule(std::string path, EnableExpression enabled,
+                           std::optional<Tarsa::CTerminology> terminology)
+    : path_(std::move(path)), enabled_(enabled), terminology_(std::move(terminology)) {}
 
 PluginModule::~PluginModule() = default;
 
 std::unique_ptr<PluginModule> PluginModule::Inspect(const std::string& path) {
   std::string entry;
   std::string expression;
+  std::optional<Tarsa::CTerminology> terminology;
   try {
     const Tarsa::CResourceTable table = Tarsa::ReadResourcesFromElf(path);
     const Tarsa::CPropertyList properties(
         table.Get(Tarsa::kPropertyListType, Tarsa::kPropertyListNumber));
     entry = properties.EntryName();
     expression = properties.EnableExpression();
+    const auto* terms = table.Find(Tarsa::kTerminologyType, Tarsa::kTerminologyNumber);
+    if (terms != nullptr) terminology.emplace(terms->data);
   } catch (const Tarsa::CException& error) {
     // The framework's texts already name the file where it matters.
     const std::string text = DefaultText(error.ErrorText());
@@ -45,7 +49,7 @@ std::unique_ptr<PluginModule> PluginModule::Inspect(const std::string& path) {
   }
   try {
     return std::unique_ptr<PluginModule>(
-        new PluginModule(path, EnableExpression::Parse(expression)));
+        new PluginModule(path, EnableExpression::Parse(expression), std::move(terminology)));
   } catch (const HostError& error) {
     throw HostError(path, error.Problem());
   }

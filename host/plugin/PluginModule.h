@@ -1,9 +1,11 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
 
 #include "framework/plugin/HostSuites.h"
+#include "framework/resource/CTerminology.h"
 #include "host/io/HostDocument.h"
 #include "host/plugin/EnableExpression.h"
 
@@ -31,6 +33,8 @@ class PluginModule {
 
   const std::string& Path() const { return path_; }
   const EnableExpression& Enabled() const { return enabled_; }
+  // Null for a module without a terminology.
+  const Tarsa::CTerminology* Terminology() const { return terminology_ ? &*terminology_ : nullptr; }
 
   // Why the module does not take the document, in words for the user; empty
   // when it does.
@@ -43,10 +47,12 @@ class PluginModule {
   Tarsa::HostEntryProc Entry() const { return entry_; }
 
  private:
-  PluginModule(std::string path, EnableExpression enabled);
+  PluginModule(std::string path, EnableExpression enabled,
+               std::optional<Tarsa::CTerminology> terminology);
 
   std::string path_;
   EnableExpression enabled_;
+  std::optional<Tarsa::CTerminology> terminology_;
   std::unique_ptr<DynamicLibrary> library_;
   Tarsa::HostEntryProc entry_ = nullptr;
 };

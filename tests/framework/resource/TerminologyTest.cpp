@@ -1,8 +1,11 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <span>
 #include <vector>
 
+#include "framework/core/CException.h"
+#include "framework/resource/CTerminology.h"
 #include "framework/resource/ModuleResources.h"
 #include "tests/framework/resource/HandBytes.h"
 
@@ -53,6 +56,57 @@ TEST(Terminology, ModuleBytesAreExact) {
   const auto table = ModuleResourceTable();
   const auto bytes = table.Get(kTerminologyType, kTerminologyNumber);
   EXPECT_EQ(std::vector<std::uint8_t>(bytes.begin(), bytes.end()), expected);
+}
+
+TEST(Terminology, TheHostReadsBackWhatTheModuleDeclares) {
+  const auto table = ModuleResourceTable();
+  const CTerminology terms(table.Get(kTerminologyType, kTerminologyNumber));
+  ASSERT_EQ(terms.Parameters().size(), 6u);
+  const CTerminology::Parameter* model = terms.FindParameter(FourCharCode("prjM"));
+  ASSERT_NE(model, nullptr);
+  EXPECT_EQ(model->type, FourCharCode("prjM"));
+  EXPECT_EQ(model->flags, 0x2000);
+  EXPECT_EQ(model->name, "$$$/Archway/AETE/Dialog/ProjectionModel=Projection Model");
+  EXPECT_EQ(terms.FindParameter(FourCharCode("focL"))->type, FourCharCode("doub"));
+  EXPECT_EQ(terms.FindParameter(FourCharCode("actV")), nullptr);
+
+  const CTerminology::Enumeration* regularizers = terms.FindEnumeration(FourCharCode("regM"));
+  ASSERT_NE(regularizers, nullptr);
+  ASSERT_EQ(regularizers->values.size(), 4u);
+  EXPECT_EQ(regularizers->values[1].code, FourCharCode("merR"));
+  EXPECT_EQ(regularizers->values[1].name, "$$$/Archway/AETE/Dialog/Mercator=Mercator");
+}
+
+// Classes and comparison operators come before the enumerations; a reader
+// that miscounts them finds no enumeration or a wrong one.
+TEST(Terminology, ClassesAndOperatorsAreReadPast) {
+  // clang-format off
+  const auto bytes = Join({
+      {1, 1, 0, 0, 0, 0, 1, 0},
+      {1}, "V", {1}, "S", "abcd", {1, 0, 1, 0, 0, 0},   // a suite with no events
+      {1, 0},                                           // one class:
+      {1}, "C", "ssal", {0},                            //   name, id, description
+      {1, 0}, {1}, "P", "porp", "gnol", {0}, {0, 0},    //   one property
+      {1, 0}, "mele", {2, 0}, "yek1", "yek2",           //   one element, two key forms
+      {1, 0}, {1}, "O", "  = ", {0},                    // one comparison operator
+      {1, 0}, "mune", {1, 0}, {1}, "E", "eulv", {0},    // one enumeration of one value
+  });
+  // clang-format on
+  const CTerminology terms(bytes);
+  EXPECT_TRUE(terms.Parameters().empty());
+  ASSERT_EQ(terms.Enumerations().size(), 1u);
+  EXPECT_EQ(terms.Enumerations()[0].id, FourCharCode("enum"));
+  EXPECT_EQ(terms.Enumerations()[0].values.at(0).code, FourCharCode("vlue"));
+
+  // Cut short anywhere, it is damaged, in the reader's own words.
+  for (std::size_t length = 0; length < bytes.size(); ++length) {
+    try {
+      const CTerminology cut(std::span<const std::uint8_t>(bytes).first(length));
+      ADD_FAILURE() << "read " << length << " bytes";
+    } catch (const CError& error) {
+      EXPECT_NE(error.ErrorText().find("terminology is damaged"), std::string::npos);
+    }
+  }
 }
 
 }  // namespace

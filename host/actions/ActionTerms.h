@@ -1,0 +1,28 @@
+#pragma once
+
+#include <string>
+
+#include "framework/resource/CTerminology.h"
+#include "host/plugin/Descriptor.h"
+
+namespace Host {
+
+// What a module's scripting terminology lets an action say to it, as the
+// host checks a recorded action before replaying it: a parameter the
+// terminology declares must have its declared type, a float must be a finite
+// number, and an enumerated value must be one the enumeration lists. Keys the
+// terminology does not declare pass unchecked; the module reads those itself.
+// Holds its own copy of the terminology.
+class ActionTerms {
+ public:
+  explicit ActionTerms(Tarsa::CTerminology terminology);
+
+  // Why the item cannot be handed to the module, in words for the user;
+  // empty when it can.
+  std::string Refusal(const Descriptor::Item& item) const;
+
+ private:
+  Tarsa::CTerminology terminology_;
+};
+
+}  // namespace Host
