@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cmath>
 #include <stdexcept>
 
@@ -33,7 +34,19 @@ int BlankSample(ImageMode mode, int plane, int colourPlanes) {
   return max;
 }
 
+// 0 until set: the physical memory then.
+std::atomic<uint64_t> memoryLimit{0};
+
 }  // namespace
+
+uint64_t HostDocument::MemoryLimit() {
+  const uint64_t set = memoryLimit.load(std::memory_order_relaxed);
+  return set != 0 ? set : PhysicalMemory();
+}
+
+void HostDocument::SetMemoryLimit(uint64_t bytes) {
+  memoryLimit.store(bytes, std::memory_order_relaxed);
+}
 
 HostDocument::HostDocument(int32_t width, int32_t height, ImageMode mode, bool hasTransparency)
     : width_(width), height_(height), mode_(mode), hasTransparency_(hasTransparency) {}
@@ -66,11 +79,13 @@ std::unique_ptr<HostDocument> HostDocument::CreateUnfilled(int32_t width, int32_
   const size_t samples = document->SamplesPerPlane();
   const int planes = document->PlaneCount();
   const uint64_t bytes = static_cast<uint64_t>(samples) * planes * (DepthOf(mode) / 8);
-  const uint64_t memory = PhysicalMemory();
-  if (memory != 0 && bytes > memory) {
+  const uint64_t limit = MemoryLimit();
+  if (limit != 0 && bytes > limit) {
+    const bool set = memoryLimit.load(std::memory_order_relaxed) != 0;
     throw HostError("an image of " + SizeText(width, height) + " pixels in " + ModeName(mode) +
-                    " needs " + std::to_string(bytes >> 20) +
-                    " MiB, more than this machine's memory");
+                    " needs " + std::to_string(bytes >> 20) + " MiB, more than " +
+                    (set ? "the " + std::to_string(limit >> 20) + " MiB a document may take"
+                         : std::string("this machine's memory")));
   }
   // Left unfilled so that pages are only touched as a reader fills them.
   for (int p = 0; p < planes; ++p) {

@@ -23,6 +23,13 @@ class HostDocument {
   // Sides beyond this are refused as implausible; 32-bit coordinates hold them.
   static constexpr int32_t kMaxSide = 1000000;
 
+  // The most bytes one document's samples may take: the machine's physical
+  // memory, unless set lower (a tool, or the fuzz targets). The readers check
+  // a file's stated size against it before anything is allocated, and hold
+  // their image libraries' own buffers to it.
+  static uint64_t MemoryLimit();
+  static void SetMemoryLimit(uint64_t bytes);
+
   // A blank document: white (no ink for CMYK, L* 100 and neutral for Lab),
   // fully opaque. Throws HostError for a size out of range or one that needs
   // more memory than the machine has; std::bad_alloc when allocation fails.

@@ -14,6 +14,7 @@
 #include <cmath>
 #include <csetjmp>
 #include <cstring>
+#include <limits>
 #include <vector>
 
 #include "host/io/HostError.h"
@@ -82,6 +83,10 @@ bool ReadJpegHeader(JpegReadJob* job) {
   if (setjmp(job->errors.jump)) return false;
   jpeg_create_decompress(&job->jpeg);
   job->created = true;
+  // libjpeg's whole-image buffers (progressive and multi-scan files) are
+  // held to the document limit; past it the file is refused.
+  job->jpeg.mem->max_memory_to_use = static_cast<long>(
+      std::min<uint64_t>(HostDocument::MemoryLimit(), std::numeric_limits<long>::max()));
   jpeg_stdio_src(&job->jpeg, job->file);
   jpeg_read_header(&job->jpeg, TRUE);
   job->adobe = job->jpeg.saw_Adobe_marker;

@@ -41,16 +41,20 @@ struct TiffCloser {
 };
 using TiffHandle = std::unique_ptr<TIFF, TiffCloser>;
 
-// libtiff's own buffers stay below this; a damaged header cannot make it
+// libtiff's own buffers, and the reader's strip or tile buffer, stay below
+// this and below the document limit; a damaged header cannot make either
 // allocate more.
-constexpr tmsize_t kMaxLibraryAllocation = tmsize_t{1} << 31;
+tmsize_t LargestAllocation() {
+  return static_cast<tmsize_t>(
+      std::min<uint64_t>(uint64_t{1} << 31, std::max<uint64_t>(HostDocument::MemoryLimit(), 1)));
+}
 
 TiffHandle Open(const std::string& path, const char* mode, TiffMessages& messages) {
   TIFFOpenOptions* options = TIFFOpenOptionsAlloc();
   if (options == nullptr) throw std::bad_alloc();
   TIFFOpenOptionsSetErrorHandlerExtR(options, OnTiffError, &messages);
   TIFFOpenOptionsSetWarningHandlerExtR(options, OnTiffWarning, nullptr);
-  TIFFOpenOptionsSetMaxSingleMemAlloc(options, kMaxLibraryAllocation);
+  TIFFOpenOptionsSetMaxSingleMemAlloc(options, LargestAllocation());
   TiffHandle tiff(TIFFOpenExt(path.c_str(), mode, options));
   TIFFOpenOptionsFree(options);
   return tiff;
@@ -274,7 +278,7 @@ std::unique_ptr<HostDocument> ReadSamples(TIFF* tiff, const TiffLayout& layout,
   }
   const tmsize_t blockSize = tiled ? TIFFTileSize(tiff) : TIFFStripSize(tiff);
   const uint64_t rowBytes = static_cast<uint64_t>(blockWidth) * stride * bytes;
-  if (blockSize <= 0 || blockSize > kMaxLibraryAllocation ||
+  if (blockSize <= 0 || blockSize > LargestAllocation() ||
       static_cast<uint64_t>(blockSize) < rowBytes) {
     Fail(path, messages, "the file's strip or tile layout is damaged");
   }
