@@ -1,6 +1,5 @@
 #include "host/plugin/Descriptor.h"
 
-#include <algorithm>
 #include <bit>
 #include <cstring>
 
@@ -64,15 +63,21 @@ bool Descriptor::Item::operator==(const Item& other) const {
 }
 
 Descriptor::Item& Descriptor::Slot(uint32_t key, Type type) {
-  auto found = std::ranges::find(items_, key, &Item::key);
-  if (found == items_.end()) {
+  auto place = places_.find(key);
+  if (place == places_.end()) {
     items_.push_back(Item{});
-    found = items_.end() - 1;
+    try {
+      place = places_.emplace(key, items_.size() - 1).first;
+    } catch (...) {
+      items_.pop_back();
+      throw;
+    }
   }
-  *found = Item{};
-  found->key = key;
-  found->type = type;
-  return *found;
+  Item& item = items_[place->second];
+  item = Item{};
+  item.key = key;
+  item.type = type;
+  return item;
 }
 
 void Descriptor::PutInteger(uint32_t key, int32_t value) {
@@ -92,8 +97,8 @@ void Descriptor::PutData(uint32_t key, std::span<const uint8_t> bytes) {
 }
 
 const Descriptor::Item* Descriptor::Find(uint32_t key) const {
-  auto found = std::ranges::find(items_, key, &Item::key);
-  return found != items_.end() ? &*found : nullptr;
+  const auto found = places_.find(key);
+  return found != places_.end() ? &items_[found->second] : nullptr;
 }
 
 std::vector<uint8_t> Descriptor::ToBytes() const {

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <span>
 #include <string>
+#include <unordered_map>
 #include <vector>
 
 namespace Host {
@@ -75,6 +76,9 @@ class Descriptor {
   Item& Slot(uint32_t key, Type type);
 
   std::vector<Item> items_;
+  // Each key's place in items_, so that reading a descriptor of many keys,
+  // which looks every key up, takes time in proportion to its size.
+  std::unordered_map<uint32_t, size_t> places_;
 };
 
 }  // namespace Host
