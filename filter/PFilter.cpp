@@ -4,9 +4,9 @@
 #include <cmath>
 #include <vector>
 
-#include "filter/params/BehaviorFile.h"
-#include "filter/params/Descriptor.h"
-#include "filter/params/PreferencesDirectory.h"
+#include "params/BehaviorFile.h"
+#include "params/Descriptor.h"
+#include "params/PreferencesDirectory.h"
 #include "framework/core/CException.h"
 #include "framework/files/CDirectory.h"
 #include "framework/native/NativeDisplay.h"

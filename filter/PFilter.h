@@ -6,8 +6,8 @@
 #include <vector>
 
 #include "filter/PImageHub.h"
-#include "filter/params/PPreferences.h"
-#include "filter/params/PSettings.h"
+#include "params/PPreferences.h"
+#include "params/PSettings.h"
 #include "framework/plugin/CQuillmarkFilter.h"
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/profiles/PLensMatcher.h"

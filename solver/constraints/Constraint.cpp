@@ -2,7 +2,7 @@
 
 #include <cmath>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "solver/frame/SolverContext.h"
 
 namespace Project {

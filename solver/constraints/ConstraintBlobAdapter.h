@@ -5,7 +5,7 @@
 #include <memory>
 #include <vector>
 
-#include "filter/params/ConstraintBlob.h"
+#include "params/ConstraintBlob.h"
 
 namespace Project {
 

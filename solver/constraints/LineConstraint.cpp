@@ -3,7 +3,7 @@
 #include <cmath>
 #include <numbers>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "solver/constraints/TraceConstraint.h"
 #include "solver/frame/Solver.h"
 

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <memory>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/sphere/Image.h"
 #include "lens/sphere/PhotoToSphere.h"

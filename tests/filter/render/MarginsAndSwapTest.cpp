@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "filter/PFilter.h"
-#include "filter/params/Descriptor.h"
+#include "params/Descriptor.h"
 #include "framework/memory/CMemoryService.h"
 #include "framework/memory/CVirtualHeap.h"
 #include "framework/plugin/CPluginEntry.h"

@@ -25,8 +25,8 @@
 #include <vector>
 
 #include "filter/PFilter.h"
-#include "filter/params/ConstraintBlob.h"
-#include "filter/params/Descriptor.h"
+#include "params/ConstraintBlob.h"
+#include "params/Descriptor.h"
 #include "framework/plugin/CPluginEntry.h"
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"

@@ -9,7 +9,7 @@
 #include <cmath>
 #include <string>
 
-#include "filter/params/Descriptor.h"
+#include "params/Descriptor.h"
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"
 #include "tests/host/app/ProgramRun.h"

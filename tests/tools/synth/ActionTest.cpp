@@ -5,8 +5,8 @@
 #include <cmath>
 #include <variant>
 
-#include "filter/params/ConstraintBlob.h"
-#include "filter/params/Descriptor.h"
+#include "params/ConstraintBlob.h"
+#include "params/Descriptor.h"
 #include "tools/synth/lib/SynthError.h"
 
 namespace Synth {

@@ -7,8 +7,8 @@
 #include <variant>
 #include <vector>
 
-#include "filter/params/ConstraintBlob.h"
-#include "filter/params/Descriptor.h"
+#include "params/ConstraintBlob.h"
+#include "params/Descriptor.h"
 #include "tools/synth/lib/ActionWriter.h"
 #include "tools/synth/lib/Render.h"
 

@@ -4,8 +4,8 @@
 #include <cmath>
 #include <vector>
 
-#include "filter/params/ConstraintBlob.h"
-#include "filter/params/Descriptor.h"
+#include "params/ConstraintBlob.h"
+#include "params/Descriptor.h"
 #include "host/actions/ActionFile.h"
 #include "tools/synth/lib/SynthError.h"
 

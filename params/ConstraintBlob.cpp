@@ -1,4 +1,4 @@
-#include "filter/params/ConstraintBlob.h"
+#include "params/ConstraintBlob.h"
 
 #include <bit>
 #include <cmath>

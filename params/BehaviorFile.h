@@ -3,7 +3,7 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "framework/files/CDirectory.h"
 
 namespace Project {

@@ -1,4 +1,4 @@
-#include "filter/params/PreferencesDirectory.h"
+#include "params/PreferencesDirectory.h"
 
 #include <string>
 

@@ -3,7 +3,7 @@
 #include <array>
 #include <cstdint>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "framework/files/CContainer.h"
 #include "framework/files/CDirectory.h"
 #include "framework/files/CStream.h"

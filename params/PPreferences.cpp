@@ -1,10 +1,10 @@
-#include "filter/params/PPreferences.h"
+#include "params/PPreferences.h"
 
 #include <algorithm>
 #include <string>
 #include <system_error>
 
-#include "filter/params/PreferencesDirectory.h"
+#include "params/PreferencesDirectory.h"
 #include "framework/core/CException.h"
 #include "framework/files/CFile.h"
 #include "framework/files/CFileContainer.h"

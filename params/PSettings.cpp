@@ -1,4 +1,4 @@
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 
 namespace Project {
 

@@ -1,12 +1,12 @@
-#include "filter/params/PPreferences.h"
+#include "params/PPreferences.h"
 
 #include <gtest/gtest.h>
 
-#include "filter/params/PreferencesDirectory.h"
+#include "params/PreferencesDirectory.h"
 #include "framework/files/CFile.h"
 #include "framework/files/CFileContainer.h"
 #include "framework/files/CMemoryContainer.h"
-#include "tests/filter/params/TestFiles.h"
+#include "tests/params/TestFiles.h"
 
 namespace Project {
 namespace {

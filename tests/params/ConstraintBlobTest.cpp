@@ -1,11 +1,11 @@
-#include "filter/params/ConstraintBlob.h"
+#include "params/ConstraintBlob.h"
 
 #include <gtest/gtest.h>
 
 #include <cstring>
 #include <random>
 
-#include "tests/filter/params/TestFiles.h"
+#include "tests/params/TestFiles.h"
 
 namespace Project {
 namespace {

@@ -4,7 +4,7 @@
 #include <span>
 #include <vector>
 
-#include "filter/params/PSettings.h"
+#include "params/PSettings.h"
 #include "framework/plugin/HostSuites.h"
 #include "framework/resource/FourCharCode.h"
 

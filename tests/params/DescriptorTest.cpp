@@ -1,6 +1,6 @@
 // The filter's descriptor keys against the host program's descriptor suite.
 
-#include "filter/params/Descriptor.h"
+#include "params/Descriptor.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,4 @@
-#include "filter/params/BehaviorFile.h"
+#include "params/BehaviorFile.h"
 
 #include <gtest/gtest.h>
 
@@ -7,7 +7,7 @@
 
 #include "framework/files/CFile.h"
 #include "framework/files/CFileContainer.h"
-#include "tests/filter/params/TestFiles.h"
+#include "tests/params/TestFiles.h"
 
 namespace Project {
 namespace {

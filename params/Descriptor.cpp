@@ -1,4 +1,4 @@
-#include "filter/params/Descriptor.h"
+#include "params/Descriptor.h"
 
 #include <cmath>
 #include <limits>

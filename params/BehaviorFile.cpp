@@ -1,4 +1,4 @@
-#include "filter/params/BehaviorFile.h"
+#include "params/BehaviorFile.h"
 
 #include <charconv>
 #include <string>
