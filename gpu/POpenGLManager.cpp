@@ -207,6 +207,18 @@ bool POpenGLManager::CreateWindowPath() {
     failureStage_ = 7;
     return false;
   }
+  // The target is a fixed 128 x 128: a context that takes no buffer or
+  // viewport that large is refused here rather than handed one.
+  GLint mostBuffer = 0;
+  GLint mostViewport[2] = {0, 0};
+  glGetIntegerv(GL_MAX_RENDERBUFFER_SIZE_EXT, &mostBuffer);
+  glGetIntegerv(GL_MAX_VIEWPORT_DIMS, mostViewport);
+  if (mostBuffer < kSurfaceSize || mostViewport[0] < kSurfaceSize ||
+      mostViewport[1] < kSurfaceSize) {
+    ReleaseCurrent();
+    failureStage_ = 8;
+    return false;
+  }
   f.glGenFramebuffersEXT(1, &framebuffer_);
   f.glBindFramebufferEXT(GL_FRAMEBUFFER_EXT, framebuffer_);
   f.glGenRenderbuffersEXT(1, &renderbuffer_);

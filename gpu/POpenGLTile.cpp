@@ -2,6 +2,7 @@
 
 #include <cstdlib>
 #include <cstring>
+#include <limits>
 
 #define EGL_NO_X11
 #include <GL/gl.h>
@@ -17,6 +18,12 @@ namespace {
 constexpr const char* kTextureTooLargeText =
     "$$$/Archway/Error/TextureTooLarge=This correction needs a texture of ^0 x ^1 texels, more "
     "than the graphics processor takes (^2 on a side).";
+
+constexpr const char* kBadDrawText =
+    "$$$/Archway/Error/BadDraw=A tile of this correction cannot be drawn: its mesh part or "
+    "texture region is beyond what the graphics processor takes.";
+
+[[noreturn]] void RefuseDraw() { throw Tarsa::CError(Tarsa::ResolveText(kBadDrawText).Str()); }
 
 GLenum TexelType(const POpenGLTilePass& pass) {
   return pass.halfTexels ? GL_HALF_FLOAT : pass.pixelType;
@@ -39,6 +46,12 @@ void RenderTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
 
 std::uint32_t DrawTilePass(POpenGLManager& manager, const POpenGLTilePass& pass) {
   constexpr int kSize = POpenGLManager::kSurfaceSize;
+  // Index counts travel as GLsizei.
+  constexpr std::size_t kMostIndices = std::numeric_limits<GLsizei>::max();
+  if (pass.drawGeometry &&
+      (pass.triangleIndices > kMostIndices || pass.quadIndices > kMostIndices)) {
+    RefuseDraw();
+  }
   manager.CountDraw();
   glViewport(0, 0, kSize, kSize);
   glMatrixMode(GL_PROJECTION);
@@ -147,6 +160,11 @@ void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
 
 void FillTileTexture(std::uint32_t texture, const POpenGLTilePass& pass, int x, int y, int width,
                      int height, const void* texels, int rowLength) {
+  // The region lies in the texture, and its rows in the caller's texels.
+  if (x < 0 || y < 0 || width < 0 || height < 0 || x > pass.textureWidth - width ||
+      y > pass.textureHeight - height || (rowLength != 0 && rowLength < width)) {
+    RefuseDraw();
+  }
   glBindTexture(GL_TEXTURE_2D, texture);
   glPixelStorei(GL_UNPACK_ALIGNMENT, 1);
   glPixelStorei(GL_UNPACK_ROW_LENGTH, rowLength);

@@ -83,7 +83,9 @@ void ReadTilePass(const POpenGLTilePass& pass, std::uint32_t madeTexture);
 // rowLength texels apart, of the pass's type.
 // Throws the framework's error when the pass's texture is empty or larger on
 // a side than the context takes: no mesh, however it came out, hands the GL
-// a size beyond its limits. DrawTilePass and DefineTileTexture check.
+// a size beyond its limits. DrawTilePass and DefineTileTexture check, and
+// DrawTilePass refuses index counts beyond GLsizei and FillTileTexture a
+// region outside the pass's texture size, both with the framework's error.
 void CheckTextureSize(POpenGLManager& manager, const POpenGLTilePass& pass);
 void DefineTileTexture(POpenGLManager& manager, std::uint32_t& texture,
                        const POpenGLTilePass& pass);

@@ -4,6 +4,7 @@
 
 #include <filesystem>
 #include <string>
+#include <vector>
 
 #include "framework/core/CException.h"
 #include "gpu/POpenGLTile.h"
@@ -82,6 +83,13 @@ TEST(POpenGLManager, TexturesBeyondTheContextsLimitAreRefused) {
   std::uint32_t texture = 0;
   EXPECT_NO_THROW(DefineTileTexture(manager, texture, pass));
   EXPECT_NE(texture, 0u);
+  // A region reaching outside the texture, or rows shorter than the region,
+  // is refused before the GL reads the texels.
+  const std::vector<std::uint8_t> texels(std::size_t(most) * 4);
+  EXPECT_THROW(FillTileTexture(texture, pass, 1, 0, most, 1, texels.data(), most), Tarsa::CError);
+  EXPECT_THROW(FillTileTexture(texture, pass, 0, 0, 2, 2, texels.data(), 2), Tarsa::CError);
+  EXPECT_THROW(FillTileTexture(texture, pass, 0, 0, 2, 1, texels.data(), 1), Tarsa::CError);
+  EXPECT_NO_THROW(FillTileTexture(texture, pass, 0, 0, most, 1, texels.data(), most));
   const GLuint name = texture;
   glDeleteTextures(1, &name);
   EXPECT_EQ(glGetError(), GLenum(GL_NO_ERROR));
