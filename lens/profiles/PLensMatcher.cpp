@@ -96,7 +96,6 @@ const char* PLensMatcher::TextOf(std::int32_t code) {
 }
 
 bool PLensMatcher::MatchProfile(bool warn) {
-  warn_ = warn;
   lastError_ = 0;
   std::int32_t code = 0;
   bool matched = false;

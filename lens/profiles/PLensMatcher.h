@@ -72,7 +72,6 @@ class PLensMatcher {
   const std::vector<std::unique_ptr<PLensRepresent>>& Candidates() const { return candidates_; }
   const PLensProfiles& Profiles() const { return profiles_; }
   std::int32_t LastError() const { return lastError_; }
-  bool Warn() const { return warn_; }
 
  private:
   // Asks the host; fills candidates_ ranked. Answers a failure code.
@@ -86,7 +85,6 @@ class PLensMatcher {
   std::vector<std::unique_ptr<PLensRepresent>> candidates_;
   PLensProfiles profiles_;
   std::int32_t lastError_ = 0;
-  bool warn_ = true;
 };
 
 }  // namespace Project

@@ -23,8 +23,6 @@ class FisheyeImage : public PhotoToSphere {
   void GetPosition(float lon, float lat, float& x, float& y) const override;
 
   float GetFocal() const { return focal_; }
-  float GetCenterX() const { return centerX_; }
-  float GetCenterY() const { return centerY_; }
 
  private:
   // The radius of the angle from the view axis, 2 focal sin(t / 2).

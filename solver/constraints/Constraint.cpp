@@ -2,7 +2,6 @@
 
 #include <cmath>
 
-#include "params/PSettings.h"
 #include "solver/frame/SolverContext.h"
 
 namespace Project {
@@ -29,22 +28,6 @@ ConstraintLook LookOf(const LineRecord& record) {
     return ConstraintLook::kVertical;
   }
   return ConstraintLook::kFixed;
-}
-
-std::uint32_t ColorOf(ConstraintLook look, const PSettings& settings) {
-  switch (look) {
-    case ConstraintLook::kOrdinary:
-      return settings.colorUnfixed;
-    case ConstraintLook::kHorizontal:
-      return settings.colorHorizontal;
-    case ConstraintLook::kVertical:
-      return settings.colorVertical;
-    case ConstraintLook::kFixed:
-      return settings.colorFixed;
-    case ConstraintLook::kInvalid:
-      break;
-  }
-  return settings.colorInvalid;
 }
 
 float SegmentDistanceSquared(Point2f p, Point2f a, Point2f b) {

@@ -9,7 +9,6 @@
 
 namespace Project {
 
-class PSettings;
 class Solver;
 class SolverContext;
 
@@ -72,8 +71,6 @@ enum class ConstraintLook { kOrdinary, kHorizontal, kVertical, kFixed, kInvalid 
 // By the record: invalid when tracing failed, else by its pinned normal,
 // exactly (0, 1) horizontal and exactly (1, 0) vertical.
 ConstraintLook LookOf(const LineRecord& record);
-// The settings' colour of a look, 0xAARRGGBB.
-std::uint32_t ColorOf(ConstraintLook look, const PSettings& settings);
 
 // The squared distance from p to the segment a to b, measured to the foot of
 // the perpendicular clamped to the segment; a zero-length segment is a.

@@ -107,7 +107,6 @@ class Solver {
   const std::vector<float>& TexCoords() const { return texCoords_; }
   std::int32_t GridSize() const { return gridSize_; }
   std::int32_t CellCount() const { return cellCount_; }
-  const ViewBox& ActiveBox() const { return activeBox_; }
   const ViewBox& FullBox() const { return fullBox_; }
   // minX, minY, maxX, maxY: how far the view centre may move.
   const float* CenterLimits() const { return centerLimits_; }

@@ -54,15 +54,6 @@ DenseMatrix<T> DenseMatrix<T>::operator*(const DenseMatrix& other) const {
 }
 
 template <typename T>
-DenseMatrix<T> DenseMatrix<T>::Transposed() const {
-  DenseMatrix result(cols_, rows_);
-  for (std::int32_t r = 0; r < rows_; ++r) {
-    for (std::int32_t c = 0; c < cols_; ++c) result(c, r) = (*this)(r, c);
-  }
-  return result;
-}
-
-template <typename T>
 DenseMatrix<T> DenseMatrix<T>::Inverse() const {
   if (rows_ != cols_) throw std::invalid_argument(kIncompatibleSizes);
   switch (rows_) {

@@ -26,14 +26,12 @@ class DenseMatrix {
   static DenseMatrix Rotation(std::int32_t axis, T angle);
 
   std::int32_t Rows() const { return rows_; }
-  std::int32_t Cols() const { return cols_; }
   T& operator()(std::int32_t r, std::int32_t c) { return values_[Index(r, c)]; }
   const T& operator()(std::int32_t r, std::int32_t c) const { return values_[Index(r, c)]; }
   const T* Data() const { return values_.data(); }
 
   // Throws std::invalid_argument when the inner sizes differ.
   DenseMatrix operator*(const DenseMatrix& other) const;
-  DenseMatrix Transposed() const;
   // The inverse of a square matrix; throws std::invalid_argument for any
   // other shape.
   DenseMatrix Inverse() const;

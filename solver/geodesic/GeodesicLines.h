@@ -52,7 +52,6 @@ class GeodesicLines {
   void SetWarp(const SphereWarp* warp) { warp_ = warp; }
   void SetImageModel(std::shared_ptr<const PhotoToSphere> imageModel);
   const std::shared_ptr<const OctaMap>& GetOctaMap() const { return octaMap_; }
-  bool UsesTriangles() const { return useTriangles_; }
 
   std::vector<LineRecord>& GetLines() { return lines_; }
   const std::vector<LineRecord>& GetLines() const { return lines_; }

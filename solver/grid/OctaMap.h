@@ -30,7 +30,6 @@ class OctaMap {
   std::int32_t Level() const { return level_; }
   // h: half the vertex count less one.
   std::int32_t Half() const { return (size_ - 1) / 2; }
-  bool UsesEliminationSolve() const { return useEliminationSolve_; }
 
   // The stored direction's latitude and longitude, ignoring the rotation.
   void GetDirection(std::int32_t i, std::int32_t j, float& outLat, float& outLon) const;

@@ -11,8 +11,9 @@ class SparseBuilder;
 // A sparse matrix in compressed rows with one-based indices: rowStart[r] is
 // the one-based position in column/value where row r begins, rowStart[0]
 // being 1, and column holds one-based column numbers. The symmetric systems
-// of the warp solver are stored by their upper triangle; the solve reads
-// these arrays directly.
+// of the warp solver are stored by their upper triangle. The sparse solve
+// reads the values in place; the indices it copies, shifted to count from
+// zero as the library does, and keeps them to tell a repeated pattern.
 //
 // Rows are written in order, one entry at a time; filledRows counts the
 // rowStart entries written (one more than the rows finished) and
@@ -47,7 +48,6 @@ class CompressedMatrix {
   std::int32_t Rows() const { return rows_; }
   std::int32_t Columns() const { return columns_; }
   std::int32_t Capacity() const { return capacity_; }
-  std::int32_t FilledRows() const { return filledRows_; }
   std::int32_t FilledEntries() const { return filledEntries_; }
   // All rows written.
   bool IsComplete() const { return filledRows_ == rows_ + 1; }
