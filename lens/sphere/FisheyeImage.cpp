@@ -4,13 +4,10 @@
 
 namespace Project {
 
-FisheyeImage::FisheyeImage(std::shared_ptr<const Image> image, float focal, float centerX,
-                           float centerY)
+FisheyeImage::FisheyeImage(std::shared_ptr<const Image> image, float focal, float, float)
     : PhotoToSphere(std::move(image)),
       focal_(focal),
-      limitRadius_(static_cast<float>(focal * std::sqrt(2.0))),
-      centerX_(centerX),
-      centerY_(centerY) {}
+      limitRadius_(static_cast<float>(focal * std::sqrt(2.0))) {}
 
 float FisheyeImage::Radius(float lon, float lat) const {
   const float t = Acos(Cos(lon) * Cos(lat));

@@ -9,8 +9,8 @@ namespace Project {
 // builds one of these for every trial focal length.
 class FisheyeImage : public PhotoToSphere {
  public:
-  // focal in pixels. The centre is kept for whoever built the model; the
-  // projection is always about the middle of the picture.
+  // focal in pixels. The centre is not used: the projection is always about
+  // the middle of the picture.
   FisheyeImage(std::shared_ptr<const Image> image, float focal, float centerX, float centerY);
 
   // The front half sphere: t below 90 degrees.
@@ -30,8 +30,6 @@ class FisheyeImage : public PhotoToSphere {
 
   const float focal_;
   const float limitRadius_;  // the radius at 90 degrees, focal sqrt(2)
-  const float centerX_;
-  const float centerY_;
 };
 
 }  // namespace Project
