@@ -214,11 +214,13 @@ std::unique_ptr<HostDocument> ReadThroughRgba(TIFF* tiff, const TiffLayout& layo
   std::unique_ptr<HostDocument> document = HostDocument::CreateUnfilled(
       static_cast<int32_t>(layout.width), static_cast<int32_t>(layout.height),
       gray ? ImageMode::kGray : ImageMode::kRgb, alpha);
-  constexpr uint32_t kChunkRows = 64;
-  std::vector<uint32_t> raster(static_cast<size_t>(layout.width) * kChunkRows);
+  // Never more rows than the image has: a wide, short image must not cost
+  // 64 rows of raster.
+  const uint32_t chunkRows = std::min<uint32_t>(64, layout.height);
+  std::vector<uint32_t> raster(static_cast<size_t>(layout.width) * chunkRows);
   std::vector<uint8_t> pixels(static_cast<size_t>(layout.width) * 4);
-  for (uint32_t top = 0; top < layout.height; top += kChunkRows) {
-    const uint32_t rows = std::min(kChunkRows, layout.height - top);
+  for (uint32_t top = 0; top < layout.height; top += chunkRows) {
+    const uint32_t rows = std::min(chunkRows, layout.height - top);
     image.row_offset = static_cast<int>(top);
     image.col_offset = 0;
     if (!TIFFRGBAImageGet(&image, raster.data(), layout.width, rows)) {
