@@ -12,6 +12,7 @@ packages=(
   libexiv2-dev
   libexempi-dev
   libsuitesparse-dev libopenblas-dev libtbb-dev
+  clang-14 libclang-rt-14-dev  # the fuzz targets: clang with libFuzzer's runtime
 )
 
 missing=()
