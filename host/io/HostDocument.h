@@ -26,7 +26,7 @@ class HostDocument {
   // The most bytes one document's samples may take: the machine's physical
   // memory, unless set lower (a tool, or the fuzz targets). The readers check
   // a file's stated size against it before anything is allocated, and hold
-  // their image libraries' own buffers to it.
+  // their image libraries' own buffers to it. Setting 0 restores the default.
   static uint64_t MemoryLimit();
   static void SetMemoryLimit(uint64_t bytes);
 

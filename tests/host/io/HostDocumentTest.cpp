@@ -2,6 +2,8 @@
 
 #include <gtest/gtest.h>
 
+#include <string>
+
 #include "host/io/HostError.h"
 
 namespace Host {
@@ -16,6 +18,23 @@ TEST(HostDocumentTest, RefusesImpossibleSizesWithoutAllocating) {
   EXPECT_THROW(HostDocument::CreateUnfilled(HostDocument::kMaxSide, HostDocument::kMaxSide,
                                             ImageMode::kCmyk64, true),
                HostError);
+}
+
+// A limit set lower holds every document to it, and says so; unset, the
+// machine's memory is the limit again.
+TEST(HostDocumentTest, MemoryLimitRefusesLargerDocuments) {
+  HostDocument::SetMemoryLimit(64 << 10);
+  EXPECT_NO_THROW(HostDocument::Create(256, 256, ImageMode::kGray));  // 64 KiB
+  try {
+    HostDocument::CreateUnfilled(256, 256, ImageMode::kRgb, false);
+    ADD_FAILURE() << "a 192 KiB document was made under a 64 KiB limit";
+  } catch (const HostError& error) {
+    EXPECT_NE(std::string(error.what()).find("a document may take"), std::string::npos)
+        << error.what();
+  }
+  HostDocument::SetMemoryLimit(0);
+  EXPECT_GT(HostDocument::MemoryLimit(), uint64_t{64} << 10);
+  EXPECT_NO_THROW(HostDocument::Create(256, 256, ImageMode::kRgb));
 }
 
 }  // namespace
