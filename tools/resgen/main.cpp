@@ -18,6 +18,7 @@
 #include "tools/resgen/PropertyListResource.h"
 #include "tools/resgen/ResourceManifest.h"
 #include "tools/resgen/TerminologyResource.h"
+#include "tools/resgen/icons/IconResources.h"
 
 namespace {
 
@@ -64,6 +65,10 @@ int Run(const fs::path& manifest, const fs::path& output, const fs::path& depfil
   const std::map<std::string, std::function<Bytes()>> builders = {
       {"@property-list", Project::BuildPropertyList},
       {"@terminology", Project::BuildTerminology},
+      // The skin images and cursors, drawn here: the index and its blocks.
+      {"@icon-index", [] { return Project::BuildIconResources().index; }},
+      {"@icon-data-low", [] { return Project::BuildIconResources().lowResolution; }},
+      {"@icon-data-high", [] { return Project::BuildIconResources().highResolution; }},
       // A string file holding only its UTF-16 little-endian byte-order mark.
       {"@utf16-bom",
        [] {
