@@ -5,6 +5,13 @@
 //
 //   fuzz_seed_maker <corpus folder> <action>... -- <photograph>...
 #include <cstdio>
+// clang-format off
+#include <jpeglib.h>
+// clang-format on
+#include <png.h>
+#include <tiffio.h>
+
+#include <algorithm>
 #include <filesystem>
 #include <fstream>
 #include <iostream>
@@ -109,6 +116,209 @@ void FromPhotograph(const fs::path& path) {
   write("jpeg", stem + ".jpg", *document, options);
 }
 
+// The layouts the host reads but does not write, made with the image
+// libraries themselves: a gradient of 32 x 24 in each.
+std::vector<uint8_t> Gradient(int width, int height, int samples) {
+  std::vector<uint8_t> pixels(static_cast<size_t>(width) * height * samples);
+  for (int y = 0; y < height; ++y) {
+    for (int x = 0; x < width; ++x) {
+      for (int c = 0; c < samples; ++c) {
+        pixels[(static_cast<size_t>(y) * width + x) * samples + c] =
+            static_cast<uint8_t>(x * 8 + y * 5 + c * 60);
+      }
+    }
+  }
+  return pixels;
+}
+
+std::string FileBytes(const fs::path& file) {
+  std::ifstream in(file, std::ios::binary);
+  return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+}
+
+struct TiffLayout {
+  const char* name;
+  uint16_t photometric;
+  uint16_t samples;
+  uint16_t bits;
+  uint16_t planar;
+  bool tiled;
+  uint16_t compression;
+  uint16_t extra;  // the first extra sample's kind, when samples has one
+};
+
+void TiffLayouts(const fs::path& scratch) {
+  constexpr int kWidth = 32, kHeight = 24;
+  const TiffLayout layouts[] = {
+      {"rgb-tiled", PHOTOMETRIC_RGB, 3, 8, PLANARCONFIG_CONTIG, true, COMPRESSION_NONE, 0},
+      {"rgba-separate-associated", PHOTOMETRIC_RGB, 4, 8, PLANARCONFIG_SEPARATE, false,
+       COMPRESSION_PACKBITS, EXTRASAMPLE_ASSOCALPHA},
+      {"rgb16-separate-tiled", PHOTOMETRIC_RGB, 3, 16, PLANARCONFIG_SEPARATE, true,
+       COMPRESSION_ADOBE_DEFLATE, 0},
+      {"palette", PHOTOMETRIC_PALETTE, 1, 8, PLANARCONFIG_CONTIG, false, COMPRESSION_LZW, 0},
+      {"bilevel-white-is-zero", PHOTOMETRIC_MINISWHITE, 1, 1, PLANARCONFIG_CONTIG, false,
+       COMPRESSION_CCITTFAX4, 0},
+      {"gray4", PHOTOMETRIC_MINISBLACK, 1, 4, PLANARCONFIG_CONTIG, false, COMPRESSION_NONE, 0},
+      {"ycbcr-jpeg", PHOTOMETRIC_YCBCR, 3, 8, PLANARCONFIG_CONTIG, false, COMPRESSION_JPEG, 0},
+      {"icclab", PHOTOMETRIC_ICCLAB, 3, 8, PLANARCONFIG_CONTIG, false, COMPRESSION_NONE, 0},
+  };
+  for (const TiffLayout& layout : layouts) {
+    const fs::path file = scratch / (std::string(layout.name) + ".tif");
+    TIFF* tiff = TIFFOpen(file.c_str(), "w");
+    if (tiff == nullptr) throw std::runtime_error("cannot write " + file.string());
+    TIFFSetField(tiff, TIFFTAG_IMAGEWIDTH, kWidth);
+    TIFFSetField(tiff, TIFFTAG_IMAGELENGTH, kHeight);
+    TIFFSetField(tiff, TIFFTAG_BITSPERSAMPLE, layout.bits);
+    TIFFSetField(tiff, TIFFTAG_SAMPLESPERPIXEL, layout.samples);
+    TIFFSetField(tiff, TIFFTAG_PHOTOMETRIC, layout.photometric);
+    TIFFSetField(tiff, TIFFTAG_PLANARCONFIG, layout.planar);
+    TIFFSetField(tiff, TIFFTAG_COMPRESSION, layout.compression);
+    if (layout.extra != 0) {
+      const uint16_t extra[] = {layout.extra};
+      TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, 1, extra);
+    }
+    if (layout.photometric == PHOTOMETRIC_PALETTE) {
+      std::vector<uint16_t> r(256), g(256), b(256);
+      for (int i = 0; i < 256; ++i) {
+        r[i] = static_cast<uint16_t>(i * 257);
+        g[i] = static_cast<uint16_t>((255 - i) * 257);
+        b[i] = static_cast<uint16_t>((i * 7 % 256) * 257);
+      }
+      TIFFSetField(tiff, TIFFTAG_COLORMAP, r.data(), g.data(), b.data());
+    }
+    if (layout.compression == COMPRESSION_JPEG) {
+      TIFFSetField(tiff, TIFFTAG_JPEGCOLORMODE, JPEGCOLORMODE_RGB);
+      TIFFSetField(tiff, TIFFTAG_YCBCRSUBSAMPLING, 2, 2);
+      TIFFSetField(tiff, TIFFTAG_ROWSPERSTRIP, 16);
+    } else if (!layout.tiled) {
+      TIFFSetField(tiff, TIFFTAG_ROWSPERSTRIP, 8);
+    }
+    if (layout.tiled) {
+      TIFFSetField(tiff, TIFFTAG_TILEWIDTH, 16);
+      TIFFSetField(tiff, TIFFTAG_TILELENGTH, 16);
+    }
+    const int planes = layout.planar == PLANARCONFIG_SEPARATE ? layout.samples : 1;
+    const std::vector<uint8_t> pixels = Gradient(kWidth * 2, kHeight, layout.samples);
+    bool ok = true;
+    for (int plane = 0; plane < planes && ok; ++plane) {
+      const auto sample = static_cast<uint16_t>(plane);
+      if (layout.tiled) {
+        std::vector<uint8_t> tile(static_cast<size_t>(TIFFTileSize(tiff)));
+        for (int y = 0; y < kHeight; y += 16) {
+          for (int x = 0; x < kWidth; x += 16) {
+            for (size_t i = 0; i < tile.size(); ++i) tile[i] = pixels[(i + x + y) % pixels.size()];
+            ok = ok && TIFFWriteTile(tiff, tile.data(), x, y, 0, sample) >= 0;
+          }
+        }
+      } else {
+        const size_t row = static_cast<size_t>(TIFFScanlineSize(tiff));
+        for (int y = 0; y < kHeight && ok; ++y) {
+          std::vector<uint8_t> line(pixels.begin() + static_cast<long>(y * row),
+                                    pixels.begin() + static_cast<long>((y + 1) * row));
+          ok = TIFFWriteScanline(tiff, line.data(), y, sample) >= 0;
+        }
+      }
+    }
+    TIFFClose(tiff);
+    if (!ok) throw std::runtime_error("libtiff could not write " + file.string());
+    Put("tiff", file.filename().string(), FileBytes(file));
+  }
+}
+
+void PngLayout(const fs::path& scratch, const char* name, int colourType, int depth,
+               bool interlaced, bool transparentColour) {
+  constexpr int kWidth = 32, kHeight = 24;
+  const fs::path file = scratch / (std::string(name) + ".png");
+  std::FILE* out = std::fopen(file.c_str(), "wb");
+  if (out == nullptr) throw std::runtime_error("cannot write " + file.string());
+  png_structp png = png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, nullptr, nullptr);
+  png_infop info = png_create_info_struct(png);
+  png_init_io(png, out);
+  png_set_IHDR(png, info, kWidth, kHeight, depth, colourType,
+               interlaced ? PNG_INTERLACE_ADAM7 : PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT,
+               PNG_FILTER_TYPE_DEFAULT);
+  if (colourType == PNG_COLOR_TYPE_PALETTE) {
+    png_color palette[16];
+    png_byte alpha[16];
+    for (int i = 0; i < 16; ++i) {
+      palette[i] = {static_cast<png_byte>(i * 16), static_cast<png_byte>(255 - i * 16),
+                    static_cast<png_byte>(i * 40)};
+      alpha[i] = static_cast<png_byte>(i * 17);
+    }
+    png_set_PLTE(png, info, palette, 16);
+    png_set_tRNS(png, info, alpha, 16, nullptr);
+  } else if (transparentColour) {
+    png_color_16 colour{};
+    colour.gray = 3;
+    colour.red = colour.green = colour.blue = 40;
+    png_set_tRNS(png, info, nullptr, 0, &colour);
+  }
+  png_write_info(png, info);
+  const int samples = png_get_channels(png, info);
+  const size_t rowBytes = png_get_rowbytes(png, info);
+  const std::vector<uint8_t> pixels = Gradient(kWidth * 2, kHeight, samples);
+  std::vector<png_bytep> rows(kHeight);
+  std::vector<uint8_t> image(rowBytes * kHeight);
+  for (int y = 0; y < kHeight; ++y) {
+    std::copy_n(pixels.begin() + static_cast<long>(y * rowBytes), rowBytes,
+                image.begin() + static_cast<long>(y * rowBytes));
+    rows[y] = image.data() + y * rowBytes;
+  }
+  png_write_image(png, rows.data());
+  png_write_end(png, info);
+  png_destroy_write_struct(&png, &info);
+  std::fclose(out);
+  Put("png", file.filename().string(), FileBytes(file));
+}
+
+void JpegLayout(const fs::path& scratch, const char* name, J_COLOR_SPACE space, int components,
+                bool progressive) {
+  constexpr int kWidth = 32, kHeight = 24;
+  const fs::path file = scratch / (std::string(name) + ".jpg");
+  std::FILE* out = std::fopen(file.c_str(), "wb");
+  if (out == nullptr) throw std::runtime_error("cannot write " + file.string());
+  jpeg_compress_struct jpeg{};
+  jpeg_error_mgr errors{};
+  jpeg.err = jpeg_std_error(&errors);
+  jpeg_create_compress(&jpeg);
+  jpeg_stdio_dest(&jpeg, out);
+  jpeg.image_width = kWidth;
+  jpeg.image_height = kHeight;
+  jpeg.input_components = components;
+  jpeg.in_color_space = space;
+  jpeg_set_defaults(&jpeg);
+  jpeg_set_quality(&jpeg, 50, TRUE);
+  if (progressive) jpeg_simple_progression(&jpeg);
+  // Without the Adobe marker a CMYK file counts ink.
+  if (space == JCS_CMYK) jpeg.write_Adobe_marker = FALSE;
+  jpeg_start_compress(&jpeg, TRUE);
+  const std::vector<uint8_t> pixels = Gradient(kWidth, kHeight, components);
+  while (jpeg.next_scanline < jpeg.image_height) {
+    JSAMPROW row = const_cast<JSAMPROW>(pixels.data()) +
+                   static_cast<size_t>(jpeg.next_scanline) * kWidth * components;
+    jpeg_write_scanlines(&jpeg, &row, 1);
+  }
+  jpeg_finish_compress(&jpeg);
+  jpeg_destroy_compress(&jpeg);
+  std::fclose(out);
+  Put("jpeg", file.filename().string(), FileBytes(file));
+}
+
+void OtherLayouts() {
+  const fs::path scratch = fs::temp_directory_path() / "archway-seed-layouts";
+  fs::create_directories(scratch);
+  TiffLayouts(scratch);
+  PngLayout(scratch, "palette-transparent", PNG_COLOR_TYPE_PALETTE, 4, false, false);
+  PngLayout(scratch, "gray-alpha-interlaced", PNG_COLOR_TYPE_GRAY_ALPHA, 8, true, false);
+  PngLayout(scratch, "rgba16-interlaced", PNG_COLOR_TYPE_RGB_ALPHA, 16, true, false);
+  PngLayout(scratch, "gray2-transparent-colour", PNG_COLOR_TYPE_GRAY, 2, false, true);
+  PngLayout(scratch, "rgb-transparent-colour", PNG_COLOR_TYPE_RGB, 8, false, true);
+  JpegLayout(scratch, "rgb-progressive", JCS_RGB, 3, true);
+  JpegLayout(scratch, "cmyk-ink-progressive", JCS_CMYK, 4, true);
+  JpegLayout(scratch, "gray-progressive", JCS_GRAYSCALE, 1, true);
+  fs::remove_all(scratch);
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -131,6 +341,7 @@ int main(int argc, char** argv) {
     }
     Preferences();
     Polygons();
+    OtherLayouts();
   } catch (const std::exception& error) {
     std::cerr << "fuzz_seed_maker: " << error.what() << "\n";
     return 1;
