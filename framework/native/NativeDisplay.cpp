@@ -15,22 +15,25 @@ bool NonEmptyEnv(const char* name) {
   return value != nullptr && value[0] != '\0';
 }
 
-bool StartVideo() {
+}  // namespace
+
+bool StartWindowSystem() {
   if (gVideoStarted) return true;
   if (!HasDisplay()) return false;
   // The host owns the process: SDL must not take over its Ctrl-C.
   SDL_SetHint(SDL_HINT_NO_SIGNAL_HANDLERS, "1");
+  // A click that activates a window also acts on what it lands on, as a
+  // user of a dialog expects.
+  SDL_SetHint(SDL_HINT_MOUSE_FOCUS_CLICKTHROUGH, "1");
   if (SDL_InitSubSystem(SDL_INIT_VIDEO) != 0) return false;
   gVideoStarted = true;
   return true;
 }
 
-}  // namespace
-
 bool HasDisplay() { return NonEmptyEnv("DISPLAY") || NonEmptyEnv("WAYLAND_DISPLAY"); }
 
 std::uint32_t KeyboardModifiers() {
-  if (!StartVideo()) return 0;
+  if (!StartWindowSystem()) return 0;
   SDL_PumpEvents();
   const SDL_Keymod mod = SDL_GetModState();
   std::uint32_t held = 0;

@@ -17,6 +17,10 @@ inline constexpr std::uint32_t kModifierShift = 8;
 // True when a display server is named in the environment.
 bool HasDisplay();
 
+// Starts the window layer's video part once; false with no display or when
+// the display cannot be opened. Windows and the event source call it.
+bool StartWindowSystem();
+
 // The modifier keys held now, as the window layer knows them; 0 with no
 // display. Starts the window layer's video part on first use.
 std::uint32_t KeyboardModifiers();

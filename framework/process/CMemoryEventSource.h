@@ -29,6 +29,7 @@ class CMemoryEventSource : public CNativeEventSource {
   void Advance(double seconds) { now_.store(now_.load() + seconds); }
   void SetPointer(CNativePoint where) { pointer_ = where; }
   void SetModifiers(std::uint32_t modifiers) { modifiers_ = modifiers; }
+  void SetButtons(std::uint32_t buttons) { buttons_ = buttons; }
   // While set, StartTimer fails.
   void SetTimersFail(bool fail) { timersFail_ = fail; }
   // Ticks every window timer at time; returns how many ticked.
@@ -46,6 +47,7 @@ class CMemoryEventSource : public CNativeEventSource {
   double Now() const override { return now_.load(); }
   CNativePoint Pointer() const override { return pointer_; }
   std::uint32_t Modifiers() const override { return modifiers_; }
+  std::uint32_t Buttons() const override { return buttons_; }
   CNativeTimerId StartTimer(CNativeWindowId window, double period,
                             std::function<void(double)> tick) override;
   void StopTimer(CNativeTimerId timer) override;
@@ -53,6 +55,8 @@ class CMemoryEventSource : public CNativeEventSource {
   void SetFocus(CNativeWindowId window) override;
 
   int SetFocusCount() const { return setFocusCalls_; }
+  void CaptureMouse(bool capture) override { captured_ = capture; }
+  bool Captured() const { return captured_; }
 
  private:
   std::deque<CNativeEvent> events_;  // sorted by time, stable
@@ -60,6 +64,8 @@ class CMemoryEventSource : public CNativeEventSource {
   std::atomic<bool> woken_{false};
   CNativePoint pointer_;
   std::uint32_t modifiers_ = 0;
+  std::uint32_t buttons_ = 0;
+  bool captured_ = false;
   bool timersFail_ = false;
   CNativeTimerId nextTimer_ = 1;
   std::map<CNativeTimerId, std::function<void(double)>> timers_;

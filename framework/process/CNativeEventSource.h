@@ -22,12 +22,12 @@ enum class ENativeKind : std::uint32_t {
   kMouseMove,
   kMouseDown,
   kMouseUp,
-  kMouseWheel,
-  kTimer,   // a native tick; the pass goes on to idlers and timers after it
-  kPaint,   // likewise
-  kWindow,  // window moved, resized, closed, activated, ...
-  kQuit,    // the user asked the application to end
-  kWake,    // sent by Wake(); carries nothing
+  kMouseWheel,  // code: lines turned, as a signed 32-bit value, away from the user positive
+  kTimer,       // a native tick; the pass goes on to idlers and timers after it
+  kPaint,       // likewise
+  kWindow,      // window moved, resized, closed, activated, ...
+  kQuit,        // the user asked the application to end
+  kWake,        // sent by Wake(); carries nothing
 };
 
 struct CNativePoint {
@@ -69,6 +69,8 @@ class CNativeEventSource {
   virtual double Now() const = 0;
   virtual CNativePoint Pointer() const = 0;
   virtual std::uint32_t Modifiers() const = 0;
+  // The mouse buttons held now, one bit a button (ButtonBit in CKeyCodes.h).
+  virtual std::uint32_t Buttons() const = 0;
 
   // A repeating timer on a window: tick(time) is called with the time of each
   // tick, in seconds, from the source's own event handling. 0 on failure.
@@ -78,6 +80,10 @@ class CNativeEventSource {
 
   virtual CNativeWindowId GetFocus() const = 0;
   virtual void SetFocus(CNativeWindowId window) = 0;
+
+  // Takes the mouse for the window while a button is held, so that a drag
+  // beyond its edge still reports; false releases it.
+  virtual void CaptureMouse(bool capture) = 0;
 };
 
 }  // namespace Tarsa

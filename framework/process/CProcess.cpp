@@ -151,6 +151,101 @@ void CProcess::DispatchNative(const CNativeEvent& event) {
   if (event.kind == ENativeKind::kQuit) {
     CMessage quit(CMessageNames::Get().cmdQuit, event.time, event.modifiers);
     SendCommand(quit);
+    return;
+  }
+  if (event.kind == ENativeKind::kKeyChar || event.kind == ENativeKind::kSysKeyChar ||
+      event.kind == ENativeKind::kKeyUp || event.kind == ENativeKind::kSysKeyUp) {
+    const CMessageNames& names = CMessageNames::Get();
+    const CObjID name = event.kind == ENativeKind::kKeyChar      ? names.keyChar
+                        : event.kind == ENativeKind::kSysKeyChar ? names.sysKeyChar
+                        : event.kind == ENativeKind::kKeyUp      ? names.keyUp
+                                                                 : names.sysKeyUp;
+    CValMsg<std::uint32_t> message(name, event.code, CValueMessage::kChange_Set, event.time,
+                                   event.modifiers);
+    CMessenger* to = Target() != nullptr ? Target() : this;
+    to->HandleMessage(message);
+    return;
+  }
+  if (CNativeWindowHandler* window = FindWindow(event.window)) window->HandleNative(event);
+}
+
+void CProcess::RegisterWindow(CNativeWindowId id, CNativeWindowHandler* handler) {
+  windows_[id] = handler;
+}
+
+void CProcess::UnregisterWindow(CNativeWindowId id) { windows_.erase(id); }
+
+CNativeWindowHandler* CProcess::FindWindow(CNativeWindowId id) const {
+  const auto found = windows_.find(id);
+  return found == windows_.end() ? nullptr : found->second;
+}
+
+bool CProcess::RunModal(const std::function<bool()>& done) {
+  while (!done()) {
+    if (!IsRunning()) return false;
+    Pass(0, std::numeric_limits<double>::infinity());
+  }
+  return true;
+}
+
+void CProcess::PumpWhileTracking(CMouseTracking& tracker) {
+  const std::uint32_t button = tracker.Button();
+  const std::uint32_t bit = 1u << (button - 1);
+  source_->CaptureMouse(true);
+  // Ends the drag whatever a handler does, so the capture never outlives it.
+  struct Release {
+    CNativeEventSource& source;
+    ~Release() { source.CaptureMouse(false); }
+  } release{*source_};
+  CNativeWindowId window = 0;
+  for (;;) {
+    CNativeEvent event;
+    bool got = source_->Take(event);
+    if (!got) {
+      // Nothing queued: a release the queue never showed is read from the
+      // button state, so a drag cannot hang.
+      if ((source_->Buttons() & bit) == 0) {
+        CNativeEvent end;
+        end.kind = ENativeKind::kMouseUp;
+        end.window = window;
+        end.time = Now();
+        end.where = source_->Pointer();
+        end.code = button;
+        tracker.OnEnd(end);
+        return;
+      }
+      got = source_->Wait(std::min(Now() + 0.05, CTimer::NextDue()), event);
+      if (!got) {
+        CTimer::FireDue(Now());
+        continue;
+      }
+    }
+    currentEvent_ = event;
+    switch (event.kind) {
+      case ENativeKind::kMouseMove:
+        window = event.window;
+        lastMouse_ = event.where;
+        tracker.Track(event);
+        break;
+      case ENativeKind::kMouseUp:
+        if (event.code == button) {
+          tracker.Track(event);
+          tracker.OnEnd(event);
+          return;
+        }
+        break;
+      case ENativeKind::kMouseDown:
+      case ENativeKind::kMouseWheel:
+        break;  // other buttons wait until the drag is over
+      default:
+        try {
+          if (!PreHandleKey(event)) DispatchNative(event);
+        } catch (...) {
+          CReporter::ReportCurrent();
+        }
+        break;
+    }
+    CTimer::FireDue(Now());
   }
 }
 

@@ -5,6 +5,7 @@
 #include <functional>
 #include <limits>
 #include <list>
+#include <map>
 #include <memory>
 #include <mutex>
 #include <vector>
@@ -12,6 +13,7 @@
 #include "framework/process/CExecutable.h"
 #include "framework/process/CMessage.h"
 #include "framework/process/CNativeEventSource.h"
+#include "framework/process/CNativeWindowHandler.h"
 #include "framework/process/CProcessEvent.h"
 #include "framework/process/CTimer.h"
 #include "framework/process/CUndoStack.h"
@@ -50,6 +52,18 @@ class CProcess : public CExecutable, public CStringSource {
   // Passes, waiting when there is nothing to do, until the clock reaches
   // until or the process quits.
   void DoEvents(double until);
+  // Passes until done() says so or the process quits: the loop of a modal
+  // window. Returns false when the process quit first.
+  bool RunModal(const std::function<bool()>& done);
+  // Follows a drag until its button goes up: moves go to the tracker in
+  // order, keys, paints, timers and window events go on as usual, so the
+  // windows keep drawing. The mouse is captured meanwhile.
+  void PumpWhileTracking(CMouseTracking& tracker);
+
+  // The windows whose events the process hands on, by native id.
+  void RegisterWindow(CNativeWindowId id, CNativeWindowHandler* handler);
+  void UnregisterWindow(CNativeWindowId id);
+  CNativeWindowHandler* FindWindow(CNativeWindowId id) const;
 
   // Queues event; any thread.
   void PostEvent(std::unique_ptr<CProcessEvent> event);
@@ -97,7 +111,8 @@ class CProcess : public CExecutable, public CStringSource {
   virtual bool TranslateAccelerator(const CNativeEvent& event);
   // Key-down events become key messages sent to the target; true when taken.
   virtual bool PreHandleKey(const CNativeEvent& event);
-  // What the window layer does with an event; here only quit is understood.
+  // What the window layer does with an event: quit becomes the quit
+  // command, typed characters go to the target, the rest to its window.
   virtual void DispatchNative(const CNativeEvent& event);
   // Every kIdlePeriod, from the idle timer.
   virtual void IdleTick(double now);
@@ -119,6 +134,7 @@ class CProcess : public CExecutable, public CStringSource {
   std::unique_ptr<CTimer> idleTimer_;
   std::unique_ptr<CUndoStack> undoStack_;
   std::vector<std::function<void()>> shutdownHooks_;
+  std::map<CNativeWindowId, CNativeWindowHandler*> windows_;
 };
 
 }  // namespace Tarsa

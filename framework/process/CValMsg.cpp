@@ -4,5 +4,7 @@ namespace Tarsa {
 
 template class CValMsg<std::uint32_t>;
 template class CValMsg<CObjID>;
+template class CValMsg<CNumber>;
+template class CValMsg<EButtonValue>;
 
 }  // namespace Tarsa

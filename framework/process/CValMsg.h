@@ -29,6 +29,15 @@ class CValueMessage : public CMessage {
   std::int32_t change = kChange_Set;
 };
 
+// A control's number, as sliders and number fields send it.
+struct CNumber {
+  double value = 0.0;
+  friend bool operator==(const CNumber&, const CNumber&) = default;
+};
+
+// A button's state, as check and push buttons send it.
+enum class EButtonValue : std::int32_t { kOff = 0, kOn = 1, kMixed = 2 };
+
 // A value message holding a value of T.
 template <class T>
 class CValMsg : public CValueMessage {
@@ -45,5 +54,7 @@ class CValMsg : public CValueMessage {
 
 extern template class CValMsg<std::uint32_t>;
 extern template class CValMsg<CObjID>;
+extern template class CValMsg<CNumber>;
+extern template class CValMsg<EButtonValue>;
 
 }  // namespace Tarsa
