@@ -4,15 +4,15 @@
 #include <cmath>
 #include <vector>
 
-#include "params/BehaviorFile.h"
-#include "params/Descriptor.h"
-#include "params/PreferencesDirectory.h"
 #include "framework/core/CException.h"
 #include "framework/files/CDirectory.h"
 #include "framework/native/NativeDisplay.h"
 #include "framework/process/CReporter.h"
 #include "lens/metadata/PXmpMeta.h"
 #include "lens/sphere/ChoosePhotoToSphere.h"
+#include "params/BehaviorFile.h"
+#include "params/Descriptor.h"
+#include "params/PreferencesDirectory.h"
 #include "solver/constraints/ConstraintBlobAdapter.h"
 #include "solver/frame/Solver.h"
 
@@ -121,7 +121,8 @@ std::string PFilter::PreferencesDirectory() const {
 
 PImageHub& PFilter::ImageHub() {
   if (imageHub_ == nullptr) {
-    imageHub_ = std::make_unique<PImageHub>(*this, ImageRect(), LayerRect(), Depth(),
+    PRenderContext& run = *this;
+    imageHub_ = std::make_unique<PImageHub>(run, ImageRect(), LayerRect(), Depth(),
                                             PreferencesDirectory(), ShaderFile());
   }
   return *imageHub_;

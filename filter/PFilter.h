@@ -6,12 +6,13 @@
 #include <vector>
 
 #include "filter/PImageHub.h"
-#include "params/PPreferences.h"
-#include "params/PSettings.h"
+#include "filter/PRenderContext.h"
 #include "framework/plugin/CQuillmarkFilter.h"
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/profiles/PLensMatcher.h"
 #include "lens/sphere/PhotoToSphere.h"
+#include "params/PPreferences.h"
+#include "params/PSettings.h"
 #include "solver/constraints/ConstraintList.h"
 #include "solver/frame/SolverContext.h"
 
@@ -23,9 +24,13 @@ namespace Project {
 // what goes back to the host. It owns, each made on first use and deleted
 // with it, the image hub (whose making starts OpenGL), the working settings
 // and the preferences; the photo's metadata and the host's lens profile
-// suite are held for one run.
-// The rest of the program reaches it through Current().
-class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, private SolverContext {
+// suite are held for one run. The image hub and its stages see it only as
+// their PRenderContext. The rest of the program reaches it through
+// Current().
+class PFilter : public Tarsa::CQuillmarkFilter,
+                private PLensMatcher::Run,
+                private SolverContext,
+                private PRenderContext {
  public:
   // What the photo's metadata says about its focal length; zero is absent.
   struct FocalData {
@@ -155,6 +160,11 @@ class PFilter : public Tarsa::CQuillmarkFilter, private PLensMatcher::Run, priva
     if (imageHub_ != nullptr) imageHub_->RebuildResults();
   }
   void RedrawResults() override {}
+
+  // The render stages' view of the run.
+  Tarsa::CQuillmarkFilter& RenderHost() override { return *this; }
+  const PSettings& RenderSettings() override { return Settings(); }
+  const Solver& RenderSolver() override { return Constraints().GetSolver(); }
 
   std::unique_ptr<PImageHub> imageHub_;
   std::unique_ptr<PSettings> settings_;

@@ -4,12 +4,13 @@
 #include <chrono>
 #include <utility>
 
-#include "filter/PFilter.h"
 #include "filter/PFinal.h"
+#include "filter/PRenderContext.h"
 #include "filter/PResult.h"
 #include "filter/PResultScaled.h"
 #include "filter/PSource.h"
 #include "filter/PSourceScaled.h"
+#include "framework/plugin/CQuillmarkFilter.h"
 #include "gpu/POpenGLManager.h"
 
 namespace Project {
@@ -26,9 +27,10 @@ std::int32_t ProgressValue(std::uint64_t value) {
 
 }  // namespace
 
-PImageHub::PImageHub(PFilter& filter, const Tarsa::CRect& imageRect, const Tarsa::CRect& sourceRect,
-                     std::uint32_t depth, std::string logDirectory, std::string shaderFile)
-    : filter_(filter),
+PImageHub::PImageHub(PRenderContext& run, const Tarsa::CRect& imageRect,
+                     const Tarsa::CRect& sourceRect, std::uint32_t depth, std::string logDirectory,
+                     std::string shaderFile)
+    : run_(run),
       imageRect_(imageRect),
       sourceRect_(sourceRect),
       textureFormat_(depth == 16 ? kGLRGBA16F : kGLRGBA),
@@ -61,7 +63,7 @@ PImageHub::~PImageHub() {
 
 PSource& PImageHub::Source() {
   if (sourceFull_ == nullptr) {
-    sourceFull_ = std::make_unique<PSource>(*this, filter_);
+    sourceFull_ = std::make_unique<PSource>(*this, run_.RenderHost());
     sourceFull_->SetRect(sourceRect_);
   }
   return *sourceFull_;
@@ -70,7 +72,7 @@ PSource& PImageHub::Source() {
 PResult& PImageHub::ResultFull() {
   if (resultFull_ == nullptr) {
     PSource& source = Source();
-    resultFull_ = std::make_unique<PResult>(*this, filter_);
+    resultFull_ = std::make_unique<PResult>(*this, run_);
     resultFull_->AddInput(source);
     resultFull_->SetRect(sourceRect_);
   }
@@ -135,15 +137,16 @@ bool PImageHub::Idle() {
 }
 
 bool PImageHub::RenderFinalSilent() {
-  const Tarsa::HostFilterRecord* record = filter_.FilterRecord();
+  Tarsa::CQuillmarkFilter& host = run_.RenderHost();
+  const Tarsa::HostFilterRecord* record = host.FilterRecord();
   const Tarsa::HostProgressProc progress = record != nullptr ? record->progressCallback : nullptr;
   const Tarsa::HostAbortProc abort = record != nullptr ? record->abortCallback : nullptr;
 
-  PFinal final(ResultFull(), filter_);
+  PFinal final(ResultFull(), host);
   Suspend();
   bool complete = false;
   try {
-    final.SetRect(filter_.LayerRect());
+    final.SetRect(host.LayerRect());
     const std::uint64_t total = final.TotalSteps();
     std::uint64_t done = final.DoneSteps();
     if (progress != nullptr) progress(ProgressValue(done), ProgressValue(total));

@@ -9,8 +9,8 @@
 
 namespace Project {
 
-class PFilter;
 class POpenGLManager;
+class PRenderContext;
 class PResult;
 class PResultScaled;
 class PSource;
@@ -35,11 +35,12 @@ class PImageHub : public Tarsa::CIdler {
   static constexpr std::uint32_t kGLUnsignedByte = 5121;
   static constexpr std::uint32_t kGLUnsignedShort = 5123;
 
-  // filter: the run's filter, which outlives the hub. The rectangles and the
-  // depth are the filter's ImageRect(), LayerRect() and Depth().
+  // run: what the stages see of the run, which outlives the hub. The
+  // rectangles and the depth are the host's ImageRect(), LayerRect() and
+  // Depth().
   // logDirectory: where the shader log goes (empty: none); shaderFile: the
   // fragment shader (empty: beside the host executable).
-  PImageHub(PFilter& filter, const Tarsa::CRect& imageRect, const Tarsa::CRect& sourceRect,
+  PImageHub(PRenderContext& run, const Tarsa::CRect& imageRect, const Tarsa::CRect& sourceRect,
             std::uint32_t depth, std::string logDirectory, std::string shaderFile = {});
   ~PImageHub() override;
   PImageHub(const PImageHub&) = delete;
@@ -89,7 +90,7 @@ class PImageHub : public Tarsa::CIdler {
   bool RenderFinalSilent();
 
  private:
-  PFilter& filter_;
+  PRenderContext& run_;
   Tarsa::CRect imageRect_;
   Tarsa::CRect sourceRect_;
   std::uint32_t textureFormat_;

@@ -4,10 +4,10 @@
 #include <cstddef>
 #include <cstdint>
 #include <memory>
-#include <set>
-#include <utility>
 #include <vector>
 
+#include "filter/PTexelBlocks.h"
+#include "filter/PTileGeometry.h"
 #include "framework/core/CRect.h"
 #include "framework/pixels/CPixProcess.h"
 #include "framework/pixels/CVirtualPixmap.h"
@@ -19,21 +19,26 @@ class CMemoryPixmap;
 
 namespace Project {
 
-class PFilter;
 struct POpenGLTilePass;
 class PImageHub;
-class Solver;
+class PRenderContext;
 
 // The corrected image: each 128 x 128 tile of the result is drawn from the
 // solver's mesh on the GPU, from a texture of just the source pixels that
 // the tile needs, read back and stored. Built for a rectangle of the result
-// plane; the whole image when the rectangle is the source's.
+// plane; the whole image when the rectangle is the source's. Which cells and
+// texels a tile needs is the tile geometry's (PTileGeometry), the source
+// tiles kept as texels are PTexelBlocks', and how samples become texels and
+// back is the texel packer's; this stage runs the GL side: it fills the
+// textures, draws and reads back, drawing one tile while the next one's
+// texture fills. It owns the result's pixels, the geometry, the kept
+// texels and the GL textures (kept from tile to tile); the hub owns the
+// stage, the GL manager and the source stage it reads.
 class PResult : public Tarsa::CPixProcess {
  public:
-  // Mesh cells and source tiles, as (column, row).
-  using CellSet = std::set<std::pair<std::int32_t, std::int32_t>>;
+  using CellSet = PTileGeometry::CellSet;
 
-  PResult(PImageHub& hub, PFilter& filter);
+  PResult(PImageHub& hub, PRenderContext& run);
   ~PResult() override;
 
   // Takes the solved mesh and indexes it for rect; the only operation that
@@ -65,28 +70,7 @@ class PResult : public Tarsa::CPixProcess {
                   const Tarsa::CRect& sourceRect, std::int32_t col, std::int32_t row);
 
  private:
-  // Where a tile's texture takes the source's pixels from, and its size.
-  struct TexturePlacement {
-    // The source's pixels in the texture, in the result's coordinates.
-    std::int32_t sourceLeft = 0;
-    std::int32_t sourceTop = 0;
-    std::int32_t sourceWidth = 0;
-    std::int32_t sourceHeight = 0;
-    std::int32_t textureWidth = 0;
-    std::int32_t textureHeight = 0;
-    // Where they lie in the texture.
-    std::int32_t padLeft = 0;
-    std::int32_t padTop = 0;
-    // The mesh vertices the tile's cells use, last ones included.
-    std::int32_t firstI = 0;
-    std::int32_t firstJ = 0;
-    std::int32_t lastI = 0;
-    std::int32_t lastJ = 0;
-    // The source rectangle, in the source's coordinates.
-    Tarsa::CRect source;
-
-    bool operator==(const TexturePlacement&) const = default;
-  };
+  using Placement = PTileGeometry::Placement;
 
   // A texture filled for the tile expected next while the GL draws the
   // current one. Source tiles that were not read yet were left out: their
@@ -95,7 +79,7 @@ class PResult : public Tarsa::CPixProcess {
     bool valid = false;
     std::int32_t col = 0;
     std::int32_t row = 0;
-    TexturePlacement placement;
+    Placement placement;
     std::uint32_t texture = 0;
     std::vector<Tarsa::CRect> late;
   };
@@ -106,7 +90,7 @@ class PResult : public Tarsa::CPixProcess {
     bool valid = false;
     std::int32_t col = 0;
     std::int32_t row = 0;
-    TexturePlacement placement;
+    Placement placement;
     std::uint64_t draw = 0;  // the manager's draw count after it
   };
 
@@ -119,49 +103,22 @@ class PResult : public Tarsa::CPixProcess {
     std::uint64_t lastUse = 0;
   };
 
-  // One source tile (a cell of the source stage) as texels. Neighbouring
-  // tiles' textures overlap by most of their pixels: kept, a source tile is
-  // read and interleaved once, and textures are filled straight from it.
-  struct TexelBlock {
-    std::int32_t col = -1;
-    std::int32_t row = -1;
-    Tarsa::CRect rect;
-    std::uint64_t lastUse = 0;
-    std::vector<std::uint8_t> texels;
-  };
-
-  void BuildTileIndex();
-  // The texture placement of tile (col, row); false for a tile with no cells
-  // or no texture.
-  bool PlaceTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
-  bool Place(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
-  // Narrows place to the source pixels the tile's own pixels read: the
-  // parts of its cells' triangles inside the tile, mapped to the source,
-  // with the kernel's reach around them. Most of a tile's cells reach well
-  // beyond it; a texture of all of them holds several times the pixels the
-  // tile shows.
-  void NarrowTexture(std::int32_t col, std::int32_t row, TexturePlacement& place) const;
-  // Texels [x0, x1) x [y0, y1) of a texture placed at place into texels_,
-  // rows of x1 - x0 texels: the source's pixels where the picture lies,
-  // zeros elsewhere.
-  void Pack(const Tarsa::CPixmap& source, const TexturePlacement& place, std::uint32_t pass,
-            std::int32_t x0, std::int32_t y0, std::int32_t x1, std::int32_t y1);
+  // The solver's mesh as it stands, for the geometry.
+  PTileGeometry::Mesh Mesh() const;
+  // The next tile in the order tiles go, row by row; false after the last.
+  bool NextTile(std::int32_t col, std::int32_t row, std::int32_t& nextCol,
+                std::int32_t& nextRow) const;
   // Packs the whole texture and writes it into texture, a band of rows at a
   // time so that the texels are still in the cache when the GL copies them.
-  void Fill(const Tarsa::CPixmap& source, const TexturePlacement& place, std::uint32_t pass,
+  void Fill(const Tarsa::CPixmap& source, const Placement& place, std::uint32_t pass,
             std::uint32_t texture);
   // Writes the zeros around the picture into texture.
-  void FillMargins(const TexturePlacement& place, std::uint32_t texture);
+  void FillMargins(const Placement& place, std::uint32_t texture);
   // Writes the source's pixels over the parts of the picture into texture
   // from the kept source tiles. Source tiles not read yet are left out and
   // their parts added to late; without late they must have been read.
-  void FillPicture(const Tarsa::CPixmap& source, const TexturePlacement& place,
-                   std::uint32_t texture, const std::vector<Tarsa::CRect>& parts,
-                   std::vector<Tarsa::CRect>* late);
-  // The source stage's cell as texels, read when not kept.
-  const TexelBlock& Block(const Tarsa::CPixmap& source, std::int32_t col, std::int32_t row,
-                          const Tarsa::CRect& rect);
-  void DropBlocks();
+  void FillPicture(const Tarsa::CPixmap& source, const Placement& place, std::uint32_t texture,
+                   const std::vector<Tarsa::CRect>& parts, std::vector<Tarsa::CRect>* late);
   // Fills a texture for the tile expected after (col, row) while the GL
   // draws from drawing; the context is current. With a step count the
   // source under that tile is read first, counted there; without, from the
@@ -185,43 +142,26 @@ class PResult : public Tarsa::CPixProcess {
   // A kept texture of the size, other than busy; given that size when none
   // has it, in place of the one used least recently.
   std::uint32_t TextureOfSize(std::int32_t width, std::int32_t height, std::uint32_t busy);
-  // From readback_ into dest.
-  void Unpack(Tarsa::CMemoryPixmap& dest, const Tarsa::CRect& tile, std::uint32_t pass) const;
   void DeleteTextures();
 
   PImageHub& hub_;
-  PFilter& filter_;
+  PRenderContext& run_;
   std::unique_ptr<Tarsa::CVirtualPixmap> pixels_;
   Tarsa::CRect rect_;
   std::int32_t resultWidth_ = 0;
   std::int32_t resultHeight_ = 0;
-  std::int32_t imageMode_;
-  std::uint32_t colorPlanes_;
   std::uint32_t depth_;
-  std::uint32_t pixelLayout_;
   std::uint32_t planes_;
-  bool fromScaled_ = false;
 
   std::int32_t currentCol_ = -1;
   std::int32_t currentRow_ = -1;
   Tarsa::CRect currentSourceRect_;
   bool currentHasCells_ = false;
 
-  float meshOriginX_ = 0;
-  float meshOriginY_ = 0;
-  float meshScaleX_ = 1;
-  float meshScaleY_ = 1;
-  std::int32_t tilesAcross_ = 0;
-  std::int32_t tilesDown_ = 0;
-  std::vector<CellSet> tileCells_;
-  std::vector<CellSet> cellTiles_;
-
+  PTileGeometry geometry_;
   // The prepared tile.
-  std::vector<float> vertexArray_;
-  std::vector<float> texCoordArray_;
-  std::vector<std::uint32_t> triangles_;
-  std::vector<std::uint32_t> quads_;
-  TexturePlacement placement_;
+  PTileGeometry::Drawing drawing_;
+  Placement placement_;
 
   // Kept from tile to tile, so that a tile costs no fresh buffers.
   std::vector<std::uint8_t> texels_;
@@ -232,21 +172,7 @@ class PResult : public Tarsa::CPixProcess {
   std::uint64_t textureUses_ = 0;
   TextureAhead ahead_;
   TileInFlight inflight_;
-  // The placement last made, for the tile it was made for.
-  struct {
-    bool valid = false;
-    std::int32_t col = 0;
-    std::int32_t row = 0;
-    bool placed = false;
-    TexturePlacement place;
-  } mutable lastPlacement_;
-  std::vector<TexelBlock> blocks_;
-  // Per cell of the source stage, row by row: its index in blocks_, or -1.
-  std::vector<std::int32_t> blockIndex_;
-  std::int32_t blockColumns_ = 0;
-  const Tarsa::CPixmap* blockSource_ = nullptr;
-  bool blockHalves_ = false;
-  std::uint64_t blockUses_ = 0;
+  PTexelBlocks blocks_;
   // At 16 bits the texture's half floats are made here rather than by the
   // GL from 16-bit integers: the same values, at a fraction of the cost.
   bool halfTexels_ = false;
