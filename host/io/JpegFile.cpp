@@ -38,11 +38,15 @@ void OnJpegError(j_common_ptr info) {
   std::longjmp(errors->jump, 1);
 }
 
-// Warnings are dropped, except the one for a file cut short: libjpeg then
-// pads the image with gray and carries on, which the host refuses.
+// Warnings are dropped, except the two for image data that end early: at
+// the end of the file, or at a marker (a file cut short and closed with an
+// end marker, or one whose data stop before the next segment). libjpeg then
+// pads the image with gray and carries on, which the host refuses: a few
+// hundred bytes could otherwise stand for a whole image of gray.
 void OnJpegMessage(j_common_ptr info, int level) {
   auto* errors = reinterpret_cast<JpegErrors*>(info->err);
-  if (level < 0 && info->err->msg_code == JWRN_JPEG_EOF) errors->endedEarly = true;
+  const int code = info->err->msg_code;
+  if (level < 0 && (code == JWRN_JPEG_EOF || code == JWRN_HIT_MARKER)) errors->endedEarly = true;
 }
 
 // Shared by the callbacks and the C-style steps: plain data only, so that a
@@ -50,6 +54,7 @@ void OnJpegMessage(j_common_ptr info, int level) {
 struct JpegReadJob {
   jpeg_decompress_struct jpeg;
   JpegErrors errors;
+  jpeg_progress_mgr progress;
   bool created;
   std::FILE* file;
   bool adobe;
@@ -68,6 +73,19 @@ struct JpegWriteJob {
   const HostDocument* source;
 };
 
+// Real files hold about ten scans; each scan of a progressive file is a
+// pass over the whole image, so a short file of many empty scans could keep
+// the reader busy for minutes. Past this many the file is refused.
+constexpr int kMostScans = 1000;
+
+void OnJpegProgress(j_common_ptr info) {
+  if (!info->is_decompressor) return;
+  if (reinterpret_cast<j_decompress_ptr>(info)->input_scan_number <= kMostScans) return;
+  auto* errors = reinterpret_cast<JpegErrors*>(info->err);
+  std::snprintf(errors->message, sizeof errors->message, "more than %d scans", kMostScans);
+  std::longjmp(errors->jump, 1);
+}
+
 void InitErrors(JpegErrors* errors) {
   jpeg_std_error(&errors->manager);
   errors->manager.error_exit = OnJpegError;
@@ -83,6 +101,8 @@ bool ReadJpegHeader(JpegReadJob* job) {
   if (setjmp(job->errors.jump)) return false;
   jpeg_create_decompress(&job->jpeg);
   job->created = true;
+  job->progress.progress_monitor = OnJpegProgress;
+  job->jpeg.progress = &job->progress;
   // libjpeg's whole-image buffers (progressive and multi-scan files) are
   // held to the document limit; past it the file is refused.
   job->jpeg.mem->max_memory_to_use = static_cast<long>(

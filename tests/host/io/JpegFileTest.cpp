@@ -5,18 +5,20 @@
 #include <jpeglib.h>
 #include <cstddef>
 #include <cstdio>
+#include <cstdlib>
+#include <string>
 #include <vector>
 
 #include "host/io/HostError.h"
 #include "host/io/ImageFile.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
-using Testing::LargestDifference;
-using Testing::PhotoLikeDocument;
-using Testing::ScratchFolder;
+using testing::LargestDifference;
+using testing::PhotoLikeDocument;
+using testing::ScratchFolder;
 
 TEST(JpegFileTest, GrayRgbAndCmykStayCloseAtFullQuality) {
   ScratchFolder folder;
@@ -43,8 +45,8 @@ TEST(JpegFileTest, GrayRgbAndCmykStayCloseAtFullQuality) {
     WriteOptions rough;
     rough.jpegQuality = 30;
     ImageFile::Write(*original, folder.File("rough.jpg"), rough);
-    EXPECT_LT(Testing::ReadBytes(folder.File("rough.jpg")).size(),
-              Testing::ReadBytes(folder.File("best.jpg")).size());
+    EXPECT_LT(testing::ReadBytes(folder.File("rough.jpg")).size(),
+              testing::ReadBytes(folder.File("best.jpg")).size());
     EXPECT_GT(LargestDifference(*original, *ImageFile::Read(folder.File("rough.jpg"))),
               LargestDifference(*original, *copy));
   }
@@ -90,6 +92,81 @@ TEST(JpegFileTest, CmykWithoutTheAdobeMarkerCountsInk) {
   for (int p = 0; p < 4; ++p) {
     // A flat block has only a DC term; its rounding moves a sample by 1 at most.
     EXPECT_NEAR(document->Sample(p, 5, 9), 255 - ink[p], 1) << "plate " << p;
+  }
+}
+
+// A JPEG file in memory: gray, of a busy pattern, baseline or progressive.
+std::string GrayJpeg(int side, bool progressive) {
+  jpeg_compress_struct jpeg;
+  jpeg_error_mgr errors;
+  jpeg.err = jpeg_std_error(&errors);
+  jpeg_create_compress(&jpeg);
+  unsigned char* bytes = nullptr;
+  unsigned long size = 0;
+  jpeg_mem_dest(&jpeg, &bytes, &size);
+  jpeg.image_width = static_cast<JDIMENSION>(side);
+  jpeg.image_height = static_cast<JDIMENSION>(side);
+  jpeg.input_components = 1;
+  jpeg.in_color_space = JCS_GRAYSCALE;
+  jpeg_set_defaults(&jpeg);
+  if (progressive) jpeg_simple_progression(&jpeg);
+  jpeg_start_compress(&jpeg, TRUE);
+  std::vector<JSAMPLE> row(static_cast<size_t>(side));
+  for (int y = 0; y < side; ++y) {
+    for (int x = 0; x < side; ++x) row[x] = static_cast<JSAMPLE>((x * 37 + y * 91) % 256);
+    JSAMPROW rows[] = {row.data()};
+    jpeg_write_scanlines(&jpeg, rows, 1);
+  }
+  jpeg_finish_compress(&jpeg);
+  std::string file(reinterpret_cast<const char*>(bytes), size);
+  jpeg_destroy_compress(&jpeg);
+  std::free(bytes);
+  return file;
+}
+
+void ExpectRefused(const std::string& path, const char* says) {
+  try {
+    JpegFile::Read(path);
+    ADD_FAILURE() << path << " was read";
+  } catch (const HostError& error) {
+    EXPECT_NE(std::string(error.what()).find(says), std::string::npos) << error.what();
+  }
+}
+
+// A short file must not stand for a large image: data that end before the
+// image does are refused, however the file ends, and so is a progressive
+// file of thousands of scans, each a pass over the whole image (past 1000;
+// a few scans more than it needs still read).
+TEST(JpegFileTest, ScansThatEndEarlyOrNumberThousandsAreRefused) {
+  ScratchFolder folder;
+  const std::string path = folder.File("damaged.jpg");
+  const std::string baseline = GrayJpeg(64, false);
+  const size_t scan = baseline.find("\xff\xda");
+  ASSERT_NE(scan, std::string::npos);
+  const size_t middle = scan + (baseline.size() - scan) / 2;
+  testing::WriteBytes(path, baseline.substr(0, middle));
+  ExpectRefused(path, "cut short");
+  // Closed with the end marker, libjpeg would read the rest as gray.
+  testing::WriteBytes(path, baseline.substr(0, middle) + "\xff\xd9");
+  ExpectRefused(path, "cut short");
+
+  // The first scan (the DC terms, read the same whatever came before)
+  // repeated after itself.
+  const std::string progressive = GrayJpeg(16, true);
+  const size_t first = progressive.find("\xff\xda");
+  const size_t second = progressive.find("\xff\xda", first + 2);
+  ASSERT_NE(second, std::string::npos);
+  const std::string firstScan = progressive.substr(first, second - first);
+  for (const int repeats : {3, 1200}) {
+    SCOPED_TRACE(repeats);
+    std::string damaged = progressive.substr(0, second);
+    for (int i = 0; i < repeats; ++i) damaged += firstScan;
+    testing::WriteBytes(path, damaged + progressive.substr(second));
+    if (repeats < 1000) {
+      EXPECT_NO_THROW(JpegFile::Read(path));
+    } else {
+      ExpectRefused(path, "scans");
+    }
   }
 }
 
