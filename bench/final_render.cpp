@@ -59,8 +59,7 @@
 #include "solver/constraints/LineConstraint.h"
 #include "solver/frame/Solver.h"
 #include "solver/grid/OctaMap.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/FilterFixture.h"
 
 namespace {
 
@@ -335,9 +334,9 @@ class Scene {
   }
 
   FrameworkScope framework_;
-  testing::ScopedConfigHome config_;
+  Project::testing::ScopedConfigHome config_;
   BenchHost host_;
-  testing::ShaderPFilter filter_;
+  Project::testing::ShaderPFilter filter_;
   Planes<Sample> original_;
   bool linesTraced_ = false;
   bool ready_ = false;

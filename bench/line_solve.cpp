@@ -25,7 +25,8 @@
 #include <vector>
 
 #include "bench/BenchSupport.h"
-#include "tests/solver/quality/QualityScene.h"
+#include "solver/iterative/IterativeWarpSolver.h"
+#include "tests/support/QualityMeasures.h"
 
 namespace {
 
@@ -34,7 +35,7 @@ using Project::bench::ResetPeak;
 using Project::bench::StatusKb;
 
 using namespace Project;
-using namespace Project::quality;
+using namespace Project::testing;
 
 CameraCase TimingCase() {
   return {"room-fisheye", Synth::SceneKind::kRoom, LensKind::kFisheye, 400.0, 1200, 800, 0.0, 0.0};

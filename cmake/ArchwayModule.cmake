@@ -55,7 +55,8 @@ endfunction()
 
 # archway_test(NAME <name> DIRS <dir>... LIBS <our libs>... [SYSTEM ...]
 #              [END_TO_END])
-# One GoogleTest program per test folder, registered with CTest; the
+# One GoogleTest program per test folder, registered with CTest and linked
+# with the shared test support (tests/support); the
 # sanitizer variant's cases carry the prefix "san.". END_TO_END marks a
 # program that drives whole runs (the program, the acceptance scenes): it is
 # built plainly only, since the code it reaches has unit tests under the
@@ -78,7 +79,7 @@ function(archway_test)
     add_executable(${target} ${sources})
     target_compile_options(${target} PRIVATE ${ARCHWAY_WARNINGS})
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
-    foreach(lib ${A_LIBS})
+    foreach(lib ${A_LIBS} archway_test_support)
       target_link_libraries(${target} PRIVATE ${lib}${variant})
     endforeach()
     target_link_libraries(${target} PRIVATE ${A_SYSTEM} GTest::gtest GTest::gmock

@@ -12,15 +12,15 @@
 namespace Project {
 namespace {
 
-using GpuTest::kShaderFile;
-using GpuTest::ReadPixels;
+using testing::kShaderFile;
+using testing::ReadPixels;
 
 constexpr int kWidth = 4;
 constexpr int kHeight = 4;
 
 // Draws the texture through the shader into a viewport of width x height,
 // the quad's texture coordinates running from (u0, v0) to (u1, v1).
-class FragmentShader : public testing::Test {
+class FragmentShader : public ::testing::Test {
  protected:
   void SetUp() override {
     manager_.SetShaderPath(kShaderFile);

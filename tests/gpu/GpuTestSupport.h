@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-namespace Project::GpuTest {
+namespace Project::testing {
 
 // The shader the project ships, in the source tree.
 inline const std::string kShaderFile =
@@ -53,4 +53,4 @@ class ForeignContext {
   EGLContext context_ = EGL_NO_CONTEXT;
 };
 
-}  // namespace Project::GpuTest
+}  // namespace Project::testing

@@ -14,10 +14,10 @@
 namespace Project {
 namespace {
 
-using GpuTest::ForeignContext;
-using GpuTest::kShaderFile;
-using GpuTest::ReadPixels;
-using TestSupport::ReadBytes;
+using testing::ForeignContext;
+using testing::kShaderFile;
+using testing::ReadPixels;
+using Tarsa::testing::ReadBytes;
 
 constexpr int kSize = POpenGLManager::kSurfaceSize;
 
@@ -156,7 +156,7 @@ TEST(POpenGLManager, LeavesTheHostsContextCurrent) {
 }
 
 TEST(POpenGLManager, ShaderResultIsLogged) {
-  TestSupport::ScratchFolder folder;
+  Tarsa::testing::ScratchFolder folder;
   const std::string log = folder.File("Shader Result.log");
   POpenGLManager manager(GL_RGBA8, folder.Dir());
   manager.SetShaderPath(kShaderFile);

@@ -71,7 +71,7 @@ TEST(BehaviorFile, LineRules) {
 }
 
 TEST(BehaviorFile, LoadsFromTheDirectory) {
-  Testing::ScratchDirectory scratch;
+  testing::ScratchDirectory scratch;
   PSettings s(1000);
   LoadBehaviorFile(s, scratch.Get());  // no file: nothing happens
   EXPECT_EQ(s.iterationNumber, 8);

@@ -10,7 +10,7 @@
 namespace Project {
 namespace {
 
-using Testing::ByteBuilder;
+using testing::ByteBuilder;
 
 BlobLine Line(float x0, float y0, float x1, float y1, std::int32_t kind, float angle = 0) {
   return BlobLine{x0, y0, x1, y1, kind, angle};

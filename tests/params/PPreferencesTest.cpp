@@ -11,7 +11,7 @@
 namespace Project {
 namespace {
 
-using Testing::ByteBuilder;
+using testing::ByteBuilder;
 constexpr std::int32_t kWidth = 3600;
 
 bool ReadBytes(PPreferences& prefs, const std::vector<std::uint8_t>& bytes) {
@@ -87,7 +87,7 @@ TEST(PPreferences, ReadsHandWrittenFilesInEitherByteOrder) {
 }
 
 TEST(PPreferences, RoundTripsThroughTheDirectory) {
-  Testing::ScratchDirectory scratch;
+  testing::ScratchDirectory scratch;
   PPreferences saved(kWidth);
   saved.displayFlags = 2;
   saved.windowLocation = {5, 6, 700, 800};
@@ -155,7 +155,7 @@ TEST(PPreferences, SkipsForeignChunksUnknownVersionsAndDamage) {
 }
 
 TEST(PPreferences, MissingOrForeignFilesAndDirectoriesFailQuietly) {
-  Testing::ScratchDirectory scratch;
+  testing::ScratchDirectory scratch;
   PPreferences prefs(kWidth);
   prefs.Load(scratch.Get());
   EXPECT_EQ(prefs.displayFlags, 3u);
@@ -168,7 +168,7 @@ TEST(PPreferences, MissingOrForeignFilesAndDirectoriesFailQuietly) {
   EXPECT_EQ(dir.GetPath(),
             scratch.Dir() + "Orvane/Orvane Quillmark VX 2099/Orvane Quillmark VX 2099 Settings/");
   EXPECT_TRUE(dir.Exists());
-  Testing::ScratchDirectory blocked;  // a file where the first level should be
+  testing::ScratchDirectory blocked;  // a file where the first level should be
   Tarsa::CFile(blocked.Get(), "Orvane", true);
   EXPECT_FALSE(GetPreferencesDirectory(blocked.Get(), dir));
 }

@@ -11,7 +11,7 @@
 #include "framework/files/CDirectory.h"
 #include "tests/support/TestSupport.h"
 
-namespace Project::Testing {
+namespace Project::testing {
 
 // Expected bytes laid down by hand in a chosen byte order, independently of
 // the framework's streams.
@@ -54,9 +54,9 @@ class ByteBuilder {
 };
 
 // A scratch folder, as the framework names directories.
-class ScratchDirectory : public TestSupport::ScratchFolder {
+class ScratchDirectory : public Tarsa::testing::ScratchFolder {
  public:
   Tarsa::CDirectory Get() const { return Tarsa::CDirectory(Dir()); }
 };
 
-}  // namespace Project::Testing
+}  // namespace Project::testing

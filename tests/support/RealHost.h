@@ -7,12 +7,14 @@
 #include <string>
 #include <vector>
 
+#include <gtest/gtest.h>
+
 #include "host/plugin/BlockExchange.h"
 #include "host/plugin/DocumentChannels.h"
 #include "host/plugin/HostRecord.h"
 #include "host/plugin/MemoryHandles.h"
 #include "host/plugin/SuiteAccess.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Tarsa::testing {
 
@@ -24,47 +26,18 @@ namespace Tarsa::testing {
 class RealHost : public Host::RunObserver {
  public:
   explicit RealHost(Host::ImageMode mode = Host::ImageMode::kRgb, std::int32_t width = 8,
-                    std::int32_t height = 6, bool transparency = false, std::uint32_t seed = 7) {
-    Live() = this;
-    MakeDocument(mode, width, height, transparency, seed);
-  }
-  ~RealHost() override {
-    scope.reset();
-    Live() = nullptr;
-  }
+                    std::int32_t height = 6, bool transparency = false, std::uint32_t seed = 7);
+  ~RealHost() override;
   RealHost(const RealHost&) = delete;
   RealHost& operator=(const RealHost&) = delete;
 
-  static RealHost*& Live() {
-    static RealHost* live = nullptr;
-    return live;
-  }
+  static RealHost*& Live();
 
   // A new document and a record for it; what the test changed in the old
   // record is gone. Rows handed to the filter carry padding, so it must step
   // by outRowBytes.
   void MakeDocument(Host::ImageMode mode, std::int32_t width, std::int32_t height,
-                    bool transparency, std::uint32_t seed = 7) {
-    scope.reset();
-    served.reset();
-    document = Host::Testing::RandomDocument(width, height, mode, transparency, seed);
-    served = std::make_unique<Host::HostRecord>(*document, settings, *this);
-    scope.emplace(*served);
-    served->Blocks().SetRowPadding(6);
-    HostFilterRecord& r = *Record();
-    propertyProcs = *static_cast<const HostPropertyProcs*>(r.propertyProcs);
-    propertyProcs.setProperty = &SetProperty;
-    handleProcs = *static_cast<const HostHandleProcs*>(r.handleProcs);
-    handleProcs.disposeHandle = handleProcs.disposeRegularHandle = &DisposeHandle;
-    channelProcs = {{1, 1}, &ReadPixels};
-    ports.readPixelsFromLevel = &ReadPixelsFromLevel;
-    r.propertyProcs = &propertyProcs;
-    r.handleProcs = &handleProcs;
-    r.channelProcs = &channelProcs;
-    r.suiteAccess = &suiteAccess;
-    hostAdvance = r.advanceCallback;
-    r.advanceCallback = &Advance;
-  }
+                    bool transparency, std::uint32_t seed = 7);
 
   HostFilterRecord* Record() { return served->Record(); }
   HostCoordinates32& Coords() { return *Record()->coordinates32; }
@@ -98,49 +71,17 @@ class RealHost : public Host::RunObserver {
   void Progress(std::int32_t, std::int32_t) override {}
 
   static HostError SetProperty(std::uint32_t signature, std::uint32_t key, std::int32_t index,
-                               std::intptr_t value, HostHandle complex) {
-    Live()->propertyWrites.emplace_back(key, value);
-    return Live()->served->Properties().Set(signature, key, index, value, complex);
-  }
-  static void DisposeHandle(HostHandle handle) {
-    ++Live()->disposed;
-    Host::MemoryHandles::Dispose(handle);
-  }
+                               std::intptr_t value, HostHandle complex);
+  static void DisposeHandle(HostHandle handle);
   // Both ways of reading a channel count, and fail when the test says.
   static HostError ReadPixels(HostChannelPort port, const HostScaling* scaling,
                               const HostRect32* rect, const HostPixelMemoryDesc* desc,
-                              HostRect32* wrote) {
-    ++Live()->readCalls;
-    if (Live()->readAnswer != 0) return Live()->readAnswer;
-    return Host::DocumentChannels::Procs()->readPixels(port, scaling, rect, desc, wrote);
-  }
+                              HostRect32* wrote);
   static HostError ReadPixelsFromLevel(HostChannelPort port, std::int32_t level,
-                                       const HostPixelMemoryDesc* desc, const HostRect32* rect) {
-    ++Live()->readCalls;
-    if (Live()->readAnswer != 0) return Live()->readAnswer;
-    return Host::DocumentChannels::PortsSuite()->readPixelsFromLevel(port, level, desc, rect);
-  }
-  static std::int16_t Advance() {
-    ++Live()->advanceCalls;
-    const std::int16_t answer = Live()->hostAdvance();
-    return Live()->advanceAnswer != 0 ? Live()->advanceAnswer : answer;
-  }
-  static HostStatus Acquire(const char* name, std::int32_t version, const void** suite) {
-    RealHost* h = Live();
-    const std::string key = std::string(name) + "#" + std::to_string(version);
-    const auto added = h->suites.find(key);
-    *suite = added != h->suites.end() ? added->second
-             : key == std::string(kChannelPortsSuite) + "#3"
-                 ? &h->ports
-                 : Host::SuiteAccess::Find(name, version);
-    if (*suite == nullptr) return -1;
-    h->acquired.push_back(key);
-    return 0;
-  }
-  static HostStatus Release(const char* name, std::int32_t version) {
-    Live()->released.push_back(std::string(name) + "#" + std::to_string(version));
-    return 0;
-  }
+                                       const HostPixelMemoryDesc* desc, const HostRect32* rect);
+  static std::int16_t Advance();
+  static HostStatus Acquire(const char* name, std::int32_t version, const void** suite);
+  static HostStatus Release(const char* name, std::int32_t version);
 
   std::unique_ptr<Host::HostRecord> served;
   std::optional<Host::HostRecord::Scope> scope;
@@ -148,6 +89,14 @@ class RealHost : public Host::RunObserver {
   HostChannelPortsSuite ports{};
   HostSuiteAccess suiteAccess{{1, 2}, &Acquire, &Release};
   HostAdvanceProc hostAdvance = nullptr;
+};
+
+// A test of runs through the plug-in entry: the framework's services are
+// torn down before and after it, so that no test sees another's.
+class PluginRunTest : public ::testing::Test {
+ protected:
+  void SetUp() override;
+  void TearDown() override;
 };
 
 }  // namespace Tarsa::testing

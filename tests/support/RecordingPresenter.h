@@ -8,7 +8,7 @@
 #include "framework/process/CAlertPresenter.h"
 #include "framework/process/CReporter.h"
 
-namespace Tarsa {
+namespace Tarsa::testing {
 
 // Records the alert texts and beeps the reporter gives while it is in scope,
 // then puts the previous presenter back.
@@ -34,4 +34,4 @@ class ScopedRecorder {
   std::unique_ptr<CAlertPresenter> previous_;
 };
 
-}  // namespace Tarsa
+}  // namespace Tarsa::testing

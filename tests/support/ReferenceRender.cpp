@@ -1,4 +1,4 @@
-#include "tests/filter/render/ReferenceRender.h"
+#include "tests/support/ReferenceRender.h"
 
 #include <algorithm>
 #include <array>

@@ -1,10 +1,10 @@
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 #include <algorithm>
 #include <cmath>
 #include <random>
 
-namespace Host::Testing {
+namespace Host::testing {
 
 std::unique_ptr<HostDocument> RandomDocument(int32_t width, int32_t height, ImageMode mode,
                                              bool transparency, uint32_t seed) {
@@ -35,6 +35,51 @@ std::unique_ptr<HostDocument> PhotoLikeDocument(int32_t width, int32_t height, I
   return document;
 }
 
+void FillDetail(HostDocument& document) {
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (int32_t y = 0; y < document.Height(); ++y) {
+      for (int32_t x = 0; x < document.Width(); ++x)
+        document.SetSample(p, x, y, (x * 7 + y * 13 + p * 50 + (x * y) % 17) % 256);
+    }
+  }
+}
+
+void FillWaves(HostDocument& document) {
+  const int max = document.MaxSample();
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (int32_t y = 0; y < document.Height(); ++y) {
+      for (int32_t x = 0; x < document.Width(); ++x) {
+        const double wave = 0.5 +
+                            0.25 * std::sin(x * 0.21 + p * 1.3) * std::cos(y * 0.17 + p * 0.7) +
+                            0.2 * std::sin(x * 0.9 + y * 0.7 + p);
+        document.SetSample(p, x, y, int(std::lround(wave * max)));
+      }
+    }
+  }
+}
+
+void FillPlanes(HostDocument& document, std::initializer_list<int> values) {
+  int p = 0;
+  for (const int value : values) {
+    for (int32_t y = 0; y < document.Height(); ++y) {
+      for (int32_t x = 0; x < document.Width(); ++x) document.SetSample(p, x, y, value);
+    }
+    if (++p == document.PlaneCount()) break;
+  }
+}
+
+std::unique_ptr<HostDocument> CopyDocument(const HostDocument& document) {
+  auto copy = HostDocument::Create(document.Width(), document.Height(), document.Mode(),
+                                   document.HasTransparency());
+  for (int p = 0; p < document.PlaneCount(); ++p) {
+    for (int32_t y = 0; y < document.Height(); ++y) {
+      for (int32_t x = 0; x < document.Width(); ++x)
+        copy->SetSample(p, x, y, document.Sample(p, x, y));
+    }
+  }
+  return copy;
+}
+
 int LargestDifference(const HostDocument& a, const HostDocument& b) {
   if (a.Width() != b.Width() || a.Height() != b.Height() || a.Mode() != b.Mode() ||
       a.PlaneCount() != b.PlaneCount()) {
@@ -51,4 +96,4 @@ int LargestDifference(const HostDocument& a, const HostDocument& b) {
   return largest;
 }
 
-}  // namespace Host::Testing
+}  // namespace Host::testing

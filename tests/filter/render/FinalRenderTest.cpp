@@ -15,10 +15,10 @@
 #include "filter/PResult.h"
 #include "framework/plugin/CPluginEntry.h"
 #include "solver/frame/Solver.h"
-#include "tests/filter/render/ReferenceRender.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/FilterFixture.h"
 #include "tests/support/MesaUnderSanitizers.h"
+#include "tests/support/RealHost.h"
+#include "tests/support/ReferenceRender.h"
 
 namespace Project::testing {
 namespace {
@@ -40,23 +40,6 @@ class CallbackHost : public Tarsa::testing::RealHost {
   }
 };
 
-// Waves, a different phase in each plane so that planes put in the wrong
-// place show. The fine one, about seven pixels long, tells the bicubic
-// kernel from a bilinear one.
-void FillSmooth(Host::HostDocument& document) {
-  const int max = document.MaxSample();
-  for (int p = 0; p < document.PlaneCount(); ++p) {
-    for (std::int32_t y = 0; y < document.Height(); ++y) {
-      for (std::int32_t x = 0; x < document.Width(); ++x) {
-        const double wave = 0.5 +
-                            0.25 * std::sin(x * 0.21 + p * 1.3) * std::cos(y * 0.17 + p * 0.7) +
-                            0.2 * std::sin(x * 0.9 + y * 0.7 + p);
-        document.SetSample(p, x, y, int(std::lround(wave * max)));
-      }
-    }
-  }
-}
-
 // A sample as the texture holds it, 0..1: 16-bit samples (0..32768) are
 // doubled into the full 16-bit range first.
 double Normalised(int sample, int depth) {
@@ -76,18 +59,8 @@ struct Tally {
   int failed = 0;
 };
 
-class FinalRender : public ::testing::Test {
+class FinalRender : public FilterRunTest {
  protected:
-  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
-  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
-
-  // A scripted run over host's document; answers the start selector's code
-  // and leaves the filter's solved mesh in filter.
-  std::int16_t RunScripted(CallbackHost& host, ShaderPFilter& filter) {
-    if (filter.HandlePrepare(host.Record(), nullptr) != 0) return -1;
-    return filter.HandleStart(host.Record(), nullptr);
-  }
-
   // Compares the host's document after the run with the CPU rendering of
   // the run's mesh over the document as it was.
   Tally Compare(const Host::HostDocument& before, const Host::HostDocument& after,
@@ -130,29 +103,15 @@ class FinalRender : public ::testing::Test {
     }
     return tally;
   }
-
-  ScopedConfigHome config;
 };
-
-std::unique_ptr<Host::HostDocument> Copy(const Host::HostDocument& document) {
-  auto copy = Host::HostDocument::Create(document.Width(), document.Height(), document.Mode(),
-                                         document.HasTransparency());
-  for (int p = 0; p < document.PlaneCount(); ++p) {
-    for (std::int32_t y = 0; y < document.Height(); ++y) {
-      for (std::int32_t x = 0; x < document.Width(); ++x)
-        copy->SetSample(p, x, y, document.Sample(p, x, y));
-    }
-  }
-  return copy;
-}
 
 // Tiles of 128 pixels with partial ones at the right and bottom: a wrong
 // tile offset, a seam or a flipped row order shows against the whole CPU
 // rendering.
 TEST_F(FinalRender, TiledResultMatchesTheMeshRenderedWhole) {
   CallbackHost host(ImageMode::kRgb, 333, 222, true);
-  FillSmooth(*host.document);
-  const auto before = Copy(*host.document);
+  Host::testing::FillWaves(*host.document);
+  const auto before = Host::testing::CopyDocument(*host.document);
   ShaderPFilter filter;
   ASSERT_EQ(RunScripted(host, filter), 0);
   const Tally tally = Compare(*before, *host.document, filter.Constraints().GetSolver(),
@@ -173,7 +132,7 @@ TEST_F(FinalRender, TiledResultMatchesTheMeshRenderedWhole) {
 // narrower than all its cells' source tiles, or the narrowing is gone.
 TEST_F(FinalRender, EachTileTextureHoldsEveryTexelItsPixelsRead) {
   CallbackHost host(ImageMode::kRgb, 333, 222, false);
-  FillSmooth(*host.document);
+  Host::testing::FillWaves(*host.document);
   ShaderPFilter filter;
   ASSERT_EQ(RunScripted(host, filter), 0);
   const Solver& solver = filter.Constraints().GetSolver();
@@ -229,8 +188,8 @@ TEST_F(FinalRender, EveryModeComesBackRight) {
                    << "mode " << int(mode) << " transparency " << transparency);
       Tarsa::CPluginEntry::TearDown();
       CallbackHost host(mode, 150, 100, transparency);
-      FillSmooth(*host.document);
-      const auto before = Copy(*host.document);
+      Host::testing::FillWaves(*host.document);
+      const auto before = Host::testing::CopyDocument(*host.document);
       ShaderPFilter filter;
       ASSERT_EQ(RunScripted(host, filter), 0);
       const int tolerance = Host::DepthOf(mode) == 8
@@ -265,18 +224,13 @@ TEST_F(FinalRender, ProgressRunsToTheTotalAndCancelWritesNothing) {
   {
     Tarsa::CPluginEntry::TearDown();
     CallbackHost host(ImageMode::kRgb, 300, 200, false);
-    const auto before = Copy(*host.document);
+    const auto before = Host::testing::CopyDocument(*host.document);
     host.abortAtCheck = 0;
     ShaderPFilter filter;
     EXPECT_EQ(RunScripted(host, filter), 1) << "a cancelled run answers 1";
     EXPECT_EQ(host.advanceCalls, 0) << "nothing went to the host";
     EXPECT_EQ(host.progress.size(), 1u);
-    int changed = 0;
-    for (int p = 0; p < 3; ++p)
-      for (std::int32_t y = 0; y < 200; ++y)
-        for (std::int32_t x = 0; x < 300; ++x)
-          changed += host.document->Sample(p, x, y) != before->Sample(p, x, y);
-    EXPECT_EQ(changed, 0);
+    EXPECT_EQ(Host::testing::LargestDifference(*before, *host.document), 0);
   }
 }
 

@@ -12,30 +12,22 @@
 #include <vector>
 
 #include "filter/PFilter.h"
-#include "params/Descriptor.h"
 #include "framework/memory/CMemoryService.h"
 #include "framework/memory/CVirtualHeap.h"
 #include "framework/plugin/CPluginEntry.h"
 #include "host/plugin/Descriptor.h"
 #include "host/plugin/MemoryHandles.h"
+#include "params/Descriptor.h"
 #include "solver/frame/Solver.h"
-#include "tests/filter/render/ReferenceRender.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/FilterFixture.h"
+#include "tests/support/RealHost.h"
+#include "tests/support/ReferenceRender.h"
 
 namespace Project::testing {
 namespace {
 
 using Host::ImageMode;
 using Tarsa::testing::RealHost;
-
-class RenderRun : public ::testing::Test {
- protected:
-  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
-  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
-
-  ScopedConfigHome config;
-};
 
 // ---- Margins ----------------------------------------------------------------------
 
@@ -65,7 +57,7 @@ class ScriptedScale {
   Tarsa::HostHandle handle_ = nullptr;
 };
 
-using Margins = RenderRun;
+using Margins = FilterRunTest;
 
 // At 100 % the whole mesh shows: around it the result has no cells, and its
 // outer ring of cells, one mesh step past the picture, maps outside it. The
@@ -83,13 +75,10 @@ TEST_F(Margins, OutsideThePictureIsZeroNotTheEdgeRepeated) {
     Host::HostDocument& document = *host.document;
     const int inside[4] = {250, 219, 31, 255};
     const int planes = document.PlaneCount();
-    for (int p = 0; p < planes; ++p)
-      for (std::int32_t y = 0; y < kHeight; ++y)
-        for (std::int32_t x = 0; x < kWidth; ++x) document.SetSample(p, x, y, inside[p]);
+    Host::testing::FillPlanes(document, {inside[0], inside[1], inside[2], inside[3]});
     const ScriptedScale scale(host, 100);
     ShaderPFilter filter;
-    ASSERT_EQ(filter.HandlePrepare(host.Record(), nullptr), 0);
-    ASSERT_EQ(filter.HandleStart(host.Record(), nullptr), 0);
+    ASSERT_EQ(RunScripted(host, filter), 0);
     ASSERT_EQ(filter.Settings().imageScale, 100) << "the run took the scripted scale";
 
     // Only the geometry is wanted: where each result pixel's source point is
@@ -192,7 +181,7 @@ void RenderWithLimit(std::uint64_t limit, const std::string& scratch, Rendered& 
   }
 }
 
-using Swap = RenderRun;
+using Swap = FilterRunTest;
 
 // The host's offer cannot take the limit below its floor of 32 MiB, more
 // than stages of a size that renders quickly; the service's setter, which
@@ -203,7 +192,7 @@ using Swap = RenderRun;
 // result equals, bit for bit, the same run held in memory (same tiles, same
 // order, same GL state).
 TEST_F(Swap, ImageAboveTheLimitRendersThroughTheSwapAsInMemory) {
-  const TestSupport::ScratchFolder scratch;
+  const Tarsa::testing::ScratchFolder scratch;
   constexpr std::uint64_t kLimit = 1 << 18;
   Rendered swapped, held;
   ASSERT_NO_FATAL_FAILURE(RenderWithLimit(kLimit, scratch.Dir(), swapped));

@@ -10,10 +10,9 @@
 #include "filter/PFilter.h"
 #include "framework/native/NativeDisplay.h"
 #include "framework/plugin/CFrameworkServices.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/FilterFixture.h"
 #include "tests/support/MesaUnderSanitizers.h"
+#include "tests/support/RecordingPresenter.h"
 
 // The driver has no frame pointers, so only the slow unwinder reaches the
 // EGL frame that the suppression names.
@@ -23,14 +22,11 @@ namespace Project::testing {
 namespace {
 
 using Tarsa::FourCC;
-using Tarsa::ScopedRecorder;
+using Tarsa::testing::ScopedRecorder;
 using Texts = std::vector<std::string>;
 
-class FilterRun : public ::testing::Test {
+class FilterRun : public FilterRunTest {
  protected:
-  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
-  void TearDown() override { Tarsa::CPluginEntry::TearDown(); }
-
   std::int16_t Call(std::int16_t selector) {
     std::int16_t result = 77;
     std::intptr_t slot = 0;
@@ -38,7 +34,6 @@ class FilterRun : public ::testing::Test {
     return result;
   }
 
-  ScopedConfigHome config;
   Tarsa::testing::RealHost host;
 };
 

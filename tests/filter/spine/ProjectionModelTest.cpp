@@ -8,14 +8,13 @@
 #include <gtest/gtest.h>
 
 #include "filter/PFilter.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/FilterFixture.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Project::testing {
 namespace {
 
-using Tarsa::ScopedRecorder;
+using Tarsa::testing::ScopedRecorder;
 using Texts = std::vector<std::string>;
 
 constexpr std::int32_t kFisheye = PSettings::kModelFisheye;
@@ -23,12 +22,11 @@ constexpr std::int32_t kPerspective = PSettings::kModelPerspective;
 constexpr std::int32_t kAuto = PSettings::kModelAuto;
 constexpr std::int32_t kSpherical = PSettings::kModelFullSpherical;
 
-class ProjectionModel : public ::testing::Test {
+class ProjectionModel : public Tarsa::testing::PluginRunTest {
  protected:
-  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
   void TearDown() override {
     filter.reset();
-    Tarsa::CPluginEntry::TearDown();
+    PluginRunTest::TearDown();
   }
   // A filter serving an image of width x height.
   TestPFilter& Make(std::int32_t width, std::int32_t height) {

@@ -13,26 +13,13 @@
 #include "filter/PResultScaled.h"
 #include "filter/PSource.h"
 #include "filter/PSourceScaled.h"
-#include "framework/plugin/CPluginEntry.h"
-#include "tests/filter/spine/SpineFixture.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/FilterFixture.h"
 #include "tests/support/MesaUnderSanitizers.h"
 
 namespace Project::testing {
 namespace {
 
 using Host::ImageMode;
-
-// A pattern with detail at every scale, so that a box misplaced by one
-// sample shows.
-void FillPattern(Host::HostDocument& document) {
-  for (int p = 0; p < document.PlaneCount(); ++p) {
-    for (std::int32_t y = 0; y < document.Height(); ++y) {
-      for (std::int32_t x = 0; x < document.Width(); ++x)
-        document.SetSample(p, x, y, (x * 7 + y * 13 + p * 50 + (x * y) % 17) % 256);
-    }
-  }
-}
 
 // The largest difference between the reduced pixmap over bounds and the
 // mean of each factor x factor block of the full one, over the first
@@ -55,23 +42,21 @@ double WorstBoxError(const Tarsa::CPixmap& full, const Tarsa::CPixmap& reduced,
   return worst;
 }
 
-class ScaledStages : public ::testing::Test {
+class ScaledStages : public FilterRunTest {
  protected:
-  void SetUp() override { Tarsa::CPluginEntry::TearDown(); }
   void TearDown() override {
     filter_.reset();
     host_.reset();
-    Tarsa::CPluginEntry::TearDown();
+    FilterRunTest::TearDown();
   }
 
   // A scripted run over a patterned picture of that size, its hub showing
   // the display rectangle.
   PImageHub& RunShowing(std::int32_t width, std::int32_t height, const Tarsa::CRect& display) {
     host_ = std::make_unique<Tarsa::testing::RealHost>(ImageMode::kRgb, width, height, false);
-    FillPattern(*host_->document);
+    Host::testing::FillDetail(*host_->document);
     filter_ = std::make_unique<ShaderPFilter>();
-    EXPECT_EQ(filter_->HandlePrepare(host_->Record(), nullptr), 0);
-    EXPECT_EQ(filter_->HandleStart(host_->Record(), nullptr), 0);
+    EXPECT_EQ(RunScripted(*host_, *filter_), 0);
     PImageHub& hub = filter_->ImageHub();
     hub.SetDisplayRect(display);
     return hub;
@@ -79,7 +64,6 @@ class ScaledStages : public ::testing::Test {
 
   std::unique_ptr<Tarsa::testing::RealHost> host_;
   std::unique_ptr<ShaderPFilter> filter_;
-  ScopedConfigHome config;
 };
 
 // A third of the picture's size: four sub-blocks a tile side (doubling

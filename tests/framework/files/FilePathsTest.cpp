@@ -103,7 +103,7 @@ TEST(FilePaths, ParentsClimbToTheRoot) {
   }
 }
 
-using EnvironmentGuard = TestSupport::ScopedEnvironment;
+using EnvironmentGuard = Tarsa::testing::ScopedEnvironment;
 
 TEST(FilePaths, FoldersFollowTheEnvironmentAndItsDefaults) {
   EnvironmentGuard home("HOME", "/h/me");

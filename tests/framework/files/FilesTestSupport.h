@@ -37,8 +37,4 @@ inline int SystemCode(const std::function<void()>& action) {
   return 0;
 }
 
-// Scratch folders and their files, made and read independently of the code
-// under test.
-using TestSupport::ScratchFolder;
-
 }  // namespace Tarsa::testing

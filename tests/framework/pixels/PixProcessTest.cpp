@@ -124,7 +124,7 @@ std::uint32_t WholeSum(std::int32_t x, std::int32_t y) {
 }
 
 struct Stages {
-  TestSupport::ScratchFolder scratch;
+  Tarsa::testing::ScratchFolder scratch;
   // Room for 8 tiles of 16 x 16; the image takes 20.
   CVirtualHeap heap{8 * 256, {scratch.Dir()}};
   PatternStage pattern{heap};

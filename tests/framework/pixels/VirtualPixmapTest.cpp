@@ -17,7 +17,7 @@
 namespace Tarsa {
 namespace {
 
-using TestSupport::ScratchFolder;
+using Tarsa::testing::ScratchFolder;
 
 constexpr const char* kSwapFailed =
     "$$$/Tarsa/Memory/Error/SwapFailed=There is not enough memory, and the scratch disks could "

@@ -10,21 +10,20 @@
 #include "framework/plugin/CQuillmarkError.h"
 #include "framework/strings/CStringTable.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/RealHost.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/RealHost.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Tarsa::testing {
 namespace {
 
 using Texts = std::vector<std::string>;
 
-class PluginEntry : public ::testing::Test {
+class PluginEntry : public PluginRunTest {
  protected:
   void SetUp() override {
-    CPluginEntry::TearDown();
+    PluginRunTest::SetUp();
     ProbeFilter::Plan() = ProbeFilter::Script{};
   }
-  void TearDown() override { CPluginEntry::TearDown(); }
 
   static bool Exists() { return CQuillmarkFilter::Current() != nullptr; }
   static int Made() { return ProbeFilter::Plan().made; }

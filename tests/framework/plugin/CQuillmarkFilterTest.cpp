@@ -17,23 +17,23 @@
 #include "framework/process/CReporter.h"
 #include "framework/strings/CStringTable.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/RealHost.h"
 
 namespace Tarsa::testing {
 namespace {
 
 using Strings = std::vector<std::string>;
 
-class FilterRecord : public ::testing::Test {
+class FilterRecord : public PluginRunTest {
  protected:
   void SetUp() override {
-    CPluginEntry::TearDown();
+    PluginRunTest::SetUp();
     ProbeFilter::Plan() = ProbeFilter::Script{};
     filter = std::make_unique<ProbeFilter>();
   }
   void TearDown() override {
     filter.reset();
-    CPluginEntry::TearDown();
+    PluginRunTest::TearDown();
   }
   // A filter selector: from here on the record is the filter's.
   void Enter() { ASSERT_EQ(filter->HandleParameters(host.Record(), nullptr), 0); }

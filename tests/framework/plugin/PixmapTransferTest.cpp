@@ -9,20 +9,20 @@
 #include "framework/core/CException.h"
 #include "framework/plugin/CQuillmarkFilter.h"
 #include "tests/framework/plugin/ProbeFilter.h"
-#include "tests/framework/plugin/RealHost.h"
+#include "tests/support/RealHost.h"
 
 namespace Tarsa::testing {
 namespace {
 
-class PixmapTransfer : public ::testing::Test {
+class PixmapTransfer : public PluginRunTest {
  protected:
   void SetUp() override {
-    CPluginEntry::TearDown();
+    PluginRunTest::SetUp();
     filter = std::make_unique<ProbeFilter>();
   }
   void TearDown() override {
     filter.reset();
-    CPluginEntry::TearDown();
+    PluginRunTest::TearDown();
   }
   void Enter() { ASSERT_EQ(filter->HandleParameters(host.Record(), nullptr), 0); }
 

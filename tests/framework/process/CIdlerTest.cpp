@@ -6,7 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "framework/core/CException.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Tarsa {
 namespace {
@@ -37,7 +37,7 @@ void Passes(int count) {
 }
 
 TEST(CIdler, EqualPrioritiesTakeTurnsAndAFailureIsReportedNotFatal) {
-  ScopedRecorder shown;
+  testing::ScopedRecorder shown;
   std::string trace;
   Letter a(0, 'a', &trace), b(0, 'b', &trace), c(0, 'c', &trace);
   a.Start();

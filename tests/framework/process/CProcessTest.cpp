@@ -15,7 +15,7 @@
 #include "framework/process/CMessageEvent.h"
 #include "framework/process/CMessageNames.h"
 #include "framework/process/CValMsg.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Tarsa {
 namespace {
@@ -152,7 +152,7 @@ TEST_F(ProcessTest, DeferredEventsWaitForEarlierNativeEvents) {
 }
 
 TEST_F(ProcessTest, FailuresAreReportedOnceAtTheirBoundary) {
-  ScopedRecorder shown;
+  testing::ScopedRecorder shown;
   process_->PostAction([] { throw CError("$$$/Test/Process/Event=Event failed."); });
   try {
     process_->DoEvent(kOnePass);

@@ -6,7 +6,7 @@
 #include <gtest/gtest.h>
 
 #include "framework/core/CException.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Tarsa {
 namespace {
@@ -15,7 +15,7 @@ using Texts = std::vector<std::string>;
 constexpr const char* kDefault = "The operation could not be completed.";
 
 TEST(CReporter, AlertTakesErrorTextThenTaskTextThenTheDefault) {
-  ScopedRecorder shown;
+  testing::ScopedRecorder shown;
   CReporter::Report(
       CError("$$$/Test/Reporter/Full=Disk is full.", "$$$/Test/Reporter/Task=Saving"));
   CReporter::Report(CError("", "$$$/Test/Reporter/Task=Saving"));
@@ -27,7 +27,7 @@ TEST(CReporter, AlertTakesErrorTextThenTaskTextThenTheDefault) {
 }
 
 TEST(CReporter, SilentShowsNothingAndNonAlertableBeeps) {
-  ScopedRecorder shown;
+  testing::ScopedRecorder shown;
   CReporter::Report(CAbort());  // a user's cancel
   CError silent("$$$/Test/Reporter/Hidden=Hidden");
   silent.SetSilent(true);

@@ -10,7 +10,7 @@
 #include "framework/core/CException.h"
 #include "framework/process/CMemoryEventSource.h"
 #include "framework/process/CProcess.h"
-#include "tests/framework/process/RecordingPresenter.h"
+#include "tests/support/RecordingPresenter.h"
 
 namespace Tarsa {
 namespace {
@@ -79,7 +79,7 @@ TEST_F(TimerTest, WindowTimersTickFromTheNativeLayerNotFromThePass) {
 }
 
 TEST_F(TimerTest, FailuresAreReportedAndTimersMayDeleteEachOther) {
-  ScopedRecorder shown;
+  testing::ScopedRecorder shown;
   CTimer failing(0.25);
   failing.SetCallback(
       [](CTimer&, std::uintptr_t data) {

@@ -25,14 +25,14 @@ using ::testing::HasSubstr;
 Bytes View(std::span<const std::uint8_t> data) { return {data.begin(), data.end()}; }
 
 Bytes ProbeFile() {
-  const std::string bytes = TestSupport::ReadBytes(ARCHWAY_RESOURCE_PROBE);
+  const std::string bytes = Tarsa::testing::ReadBytes(ARCHWAY_RESOURCE_PROBE);
   return {bytes.begin(), bytes.end()};
 }
 
 // The refusal's text for a file of these bytes (none: no file at all), or
 // "" when the file was read.
 std::string RefusalOf(const std::optional<Bytes>& bytes) {
-  const TestSupport::ScratchFolder folder;
+  const Tarsa::testing::ScratchFolder folder;
   if (bytes) folder.Put("module.so", *bytes);
   try {
     ReadResourcesFromElf(folder.File("module.so"));

@@ -7,8 +7,8 @@
 namespace Tarsa {
 namespace {
 
-using Resolve = test::FreshStringTable;
-using test::FakeSource;
+using Resolve = testing::FreshStringTable;
+using testing::FakeSource;
 
 TEST_F(Resolve, ParametersSurviveResolveAndAreFilledInOrder) {
   const CString title("$$$/Archway/Dialog/Title=Archway (^0 @ ^1%)");

@@ -7,7 +7,7 @@
 namespace Tarsa {
 namespace {
 
-using StringTableService = test::FreshStringTable;
+using StringTableService = testing::FreshStringTable;
 
 TEST(StringTable, HashMatchesHandComputedValues) {
   EXPECT_EQ(CStringTable::Hash(""), 0u);

@@ -22,7 +22,7 @@ Entries Contents(const CStringTable& table) {
 }
 
 Entries Load(std::u16string_view text, bool littleEndian = true, bool withMark = true) {
-  const auto bytes = test::Utf16File(text, littleEndian, withMark);
+  const auto bytes = testing::Utf16File(text, littleEndian, withMark);
   CStringTable table;
   LoadStringFile(table, bytes.data(), bytes.size());
   return Contents(table);
@@ -66,8 +66,8 @@ TEST(StringFile, EntriesKeysAndValues) {
 
 TEST(StringFile, LaterEntriesAndLaterFilesOverride) {
   CStringTable table;
-  const auto first = test::Utf16File(u"/A=one\n/B=keep\n/A=two\n", true, true);
-  const auto second = test::Utf16File(u"/A=three", false, true);
+  const auto first = testing::Utf16File(u"/A=one\n/B=keep\n/A=two\n", true, true);
+  const auto second = testing::Utf16File(u"/A=three", false, true);
   LoadStringFile(table, first.data(), first.size());
   EXPECT_EQ(Contents(table), (Entries{{"/A", "two"}, {"/B", "keep"}}));
   LoadStringFile(table, second.data(), second.size());
@@ -77,7 +77,7 @@ TEST(StringFile, LaterEntriesAndLaterFilesOverride) {
 TEST(StringFile, TinyInputsReadNothing) {
   EXPECT_EQ(Load(u""), Entries{});                              // a mark alone
   EXPECT_EQ(Load(u"/", false, /*withMark=*/false), Entries{});  // one unit
-  auto odd = test::Utf16File(u"/K=v", false, true);
+  auto odd = testing::Utf16File(u"/K=v", false, true);
   odd.push_back(0x41);  // half a unit at the end is ignored
   CStringTable table;
   LoadStringFile(table, odd.data(), odd.size());

@@ -10,7 +10,7 @@
 #include "framework/strings/CStringSource.h"
 #include "framework/strings/CStringTable.h"
 
-namespace Tarsa::test {
+namespace Tarsa::testing {
 
 // Starts and ends every test without a string table service, so tests that
 // fill it cannot leak into one another.
@@ -80,4 +80,4 @@ inline bool IsValidUtf8(std::string_view s) {
   return true;
 }
 
-}  // namespace Tarsa::test
+}  // namespace Tarsa::testing

@@ -12,8 +12,8 @@
 namespace Tarsa {
 namespace {
 
-using StringsFuzz = test::FreshStringTable;
-using test::IsValidUtf8;
+using StringsFuzz = testing::FreshStringTable;
+using testing::IsValidUtf8;
 
 TEST_F(StringsFuzz, StringFileParserTakesAnyBytes) {
   // Bytes that steer the parser into its states, mixed with random ones.
@@ -37,7 +37,7 @@ TEST_F(StringsFuzz, StringFileParserTakesAnyBytes) {
 TEST_F(StringsFuzz, TruncatedFileKeepsEveryCompleteEntry) {
   const std::u16string text =
       u"\"$$$/A=alpha ^n\"\r\n/B=b\\\"e\\\\ta\n\"$$$/C=caf\u00E9 \U0001F600\"\n";
-  const auto full = test::Utf16File(text, /*littleEndian=*/true, /*withMark=*/true);
+  const auto full = testing::Utf16File(text, /*littleEndian=*/true, /*withMark=*/true);
   CStringTable whole;
   LoadStringFile(whole, full.data(), full.size());
   ASSERT_EQ(whole.Count(), 3u);

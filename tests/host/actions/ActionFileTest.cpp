@@ -9,7 +9,7 @@
 #include "host/actions/ActionFile.h"
 #include "host/actions/Base64.h"
 #include "host/io/HostError.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
@@ -52,7 +52,7 @@ TEST(ActionFileTest, EveryValueRoundTripsExactlyThroughAFile) {
   for (int i = 0; i < 256; ++i) all[i] = static_cast<uint8_t>(i);
   descriptor.PutData(FourCC("cnsD"), all);
 
-  Testing::ScratchFolder folder;
+  testing::ScratchFolder folder;
   const std::string path = folder.File("correction.action");
   ActionFile::Write(descriptor, path);
   EXPECT_EQ(ActionFile::Read(path), descriptor);
@@ -109,9 +109,9 @@ TEST(ActionFileTest, DamagedFilesNameTheLine) {
 }
 
 TEST(ActionFileTest, ReadingNamesTheFile) {
-  Testing::ScratchFolder folder;
+  testing::ScratchFolder folder;
   const std::string path = folder.File("bad.action");
-  Testing::WriteBytes(path, "archway-action 1\nactV integer zero\n");
+  testing::WriteBytes(path, "archway-action 1\nactV integer zero\n");
   for (const std::string& file : {path, folder.File("missing.action")}) {
     try {
       ActionFile::Read(file);

@@ -6,16 +6,16 @@
 #include "host/app/CommandLine.h"
 #include "host/app/ImageBatch.h"
 #include "host/io/HostError.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
 TEST(ImageBatchTest, FoldersExpandToTheirImagesAndResultsGoBeside) {
-  Testing::ScratchFolder folder;
+  testing::ScratchFolder folder;
   for (const char* name :
        {"b.TIF", "a.png", "c.jpeg", "notes.txt", ".hidden.tif", "a-archway.png", "d.tiff"}) {
-    Testing::WriteBytes(folder.File(name), "x");
+    testing::WriteBytes(folder.File(name), "x");
   }
   std::filesystem::create_directory(folder.File("sub.tif"));
   const auto jobs = ImageBatch::Plan({folder.File("")}, std::nullopt);
@@ -30,11 +30,11 @@ TEST(ImageBatchTest, FoldersExpandToTheirImagesAndResultsGoBeside) {
 }
 
 TEST(ImageBatchTest, OutputOptionsAndTheirRefusals) {
-  Testing::ScratchFolder folder;
+  testing::ScratchFolder folder;
   std::filesystem::create_directory(folder.File("out"));
   std::filesystem::create_directory(folder.File("empty"));
-  Testing::WriteBytes(folder.File("a.tif"), "x");
-  Testing::WriteBytes(folder.File("b.tif"), "x");
+  testing::WriteBytes(folder.File("a.tif"), "x");
+  testing::WriteBytes(folder.File("b.tif"), "x");
   const std::string a = folder.File("a.tif"), b = folder.File("b.tif");
 
   EXPECT_EQ(ImageBatch::Plan({a}, folder.File("x.png"))[0].output, folder.File("x.png"));

@@ -17,11 +17,11 @@
 #include <utility>
 #include <vector>
 
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 extern char** environ;
 
-namespace Host::Testing {
+namespace Host::testing {
 
 #ifdef ARCHWAY_REAL_MODULE
 
@@ -141,4 +141,4 @@ inline bool HasLine(const std::string& text, const std::string& line) {
 
 #endif  // ARCHWAY_REAL_MODULE
 
-}  // namespace Host::Testing
+}  // namespace Host::testing

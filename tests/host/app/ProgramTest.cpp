@@ -13,7 +13,7 @@
 #include "framework/plugin/HostSuites.h"
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 #include "tools/synth/lib/PhotoWriter.h"
 #include "tools/synth/lib/Render.h"
 
@@ -21,8 +21,8 @@ namespace Host {
 namespace {
 
 using Tarsa::FourCC;
-using Testing::ReadBytes;
-using Testing::ScratchFolder;
+using testing::ReadBytes;
+using testing::ScratchFolder;
 
 struct Result {
   int status = -1;
@@ -80,7 +80,7 @@ std::vector<std::string> WriteSamples(const ScratchFolder& folder) {
   std::vector<std::string> bytes;
   uint32_t seed = 100;
   for (const Sample& sample : kSamples) {
-    auto document = Testing::RandomDocument(13, 9, sample.mode, sample.transparency, seed++);
+    auto document = testing::RandomDocument(13, 9, sample.mode, sample.transparency, seed++);
     ImageFile::Write(*document, folder.File(sample.name));
     bytes.push_back(ReadBytes(folder.File(sample.name)));
   }
@@ -126,7 +126,7 @@ TEST_F(ProgramTest, ApplyCorrectsAFolderOfEveryKindAndLeavesTheInputsAsTheyWere)
 }
 
 TEST_F(ProgramTest, RefusalsOfTheModuleReachTheUserAndWriteNothing) {
-  auto document = Testing::RandomDocument(8, 8, ImageMode::kRgb, false, 1);
+  auto document = testing::RandomDocument(8, 8, ImageMode::kRgb, false, 1);
   const std::string input = folder_.File("photo.tif");
   ImageFile::Write(*document, input);
   const std::string listing = folder_.Listing();
@@ -147,7 +147,7 @@ TEST_F(ProgramTest, RefusalsOfTheModuleReachTheUserAndWriteNothing) {
 }
 
 TEST_F(ProgramTest, SavedActionsReplay) {
-  auto document = Testing::RandomDocument(8, 8, ImageMode::kGray, false, 2);
+  auto document = testing::RandomDocument(8, 8, ImageMode::kGray, false, 2);
   const std::string input = folder_.File("photo.png");
   ImageFile::Write(*document, input);
   const std::string first = folder_.File("first.action");
@@ -172,18 +172,18 @@ TEST_F(ProgramTest, SavedActionsReplay) {
   EXPECT_EQ(ReadBytes(folder_.File("again.png")), ReadBytes(folder_.File("photo-archway.png")));
 
   // A damaged action is refused before any image is touched.
-  Testing::WriteBytes(first, "archway-action 1\nruns integer one\n");
+  testing::WriteBytes(first, "archway-action 1\nruns integer one\n");
   result = RunProgram({"apply", "--module", module_, "--action", first, input});
   EXPECT_EQ(result.status, 1);
   EXPECT_NE(result.errors.find(first + "': line 2:"), std::string::npos) << result.errors;
 }
 
 TEST_F(ProgramTest, FailuresAndCtrlCLeaveNoOutput) {
-  auto document = Testing::RandomDocument(8, 8, ImageMode::kRgb48, false, 3);
+  auto document = testing::RandomDocument(8, 8, ImageMode::kRgb48, false, 3);
   const std::string good = folder_.File("good.tif");
   ImageFile::Write(*document, good);
   const std::string damaged = folder_.File("damaged.tif");
-  Testing::WriteBytes(damaged, ReadBytes(good).substr(0, 100));
+  testing::WriteBytes(damaged, ReadBytes(good).substr(0, 100));
 
   // A damaged image fails alone; the others are still corrected.
   Result result = RunProgram({"apply", "--module", module_, damaged, good});
@@ -218,7 +218,7 @@ TEST_F(ProgramTest, FailuresAndCtrlCLeaveNoOutput) {
   EXPECT_EQ(result.status, 1);
   EXPECT_NE(result.errors.find("missing.so"), std::string::npos) << result.errors;
   // A result the chosen format cannot hold is refused before the module runs.
-  ImageFile::Write(*Testing::RandomDocument(4, 4, ImageMode::kCmyk, false, 4),
+  ImageFile::Write(*testing::RandomDocument(4, 4, ImageMode::kCmyk, false, 4),
                    folder_.File("cmyk.tif"));
   result = RunProgram(
       {"apply", "--module", module_, "-o", folder_.File("out.png"), folder_.File("cmyk.tif")});

@@ -19,9 +19,9 @@ namespace {
 
 #ifdef ARCHWAY_REAL_MODULE
 
-using Testing::ProgramRun;
-using Testing::ScratchFolder;
-using Testing::WriteBytes;
+using testing::ProgramRun;
+using testing::ScratchFolder;
+using testing::WriteBytes;
 
 // The border met along each scan line (a row, or a column when across is
 // false), from the start of the line: where the picture's covered share
@@ -93,9 +93,7 @@ TEST(ResultBorder, TheFisheyeCircleAndTheFrameComeOutSmoothAndAntiAliased) {
   ScratchFolder folder;
   constexpr int kWidth = 900, kHeight = 600, kLevel = 180;
   auto photo = HostDocument::Create(kWidth, kHeight, ImageMode::kRgb, false);
-  for (int p = 0; p < 3; ++p)
-    for (int y = 0; y < kHeight; ++y)
-      for (int x = 0; x < kWidth; ++x) photo->SetSample(p, x, y, kLevel);
+  testing::FillPlanes(*photo, {kLevel, kLevel, kLevel});
   const std::string input = folder.File("plain.tif"), output = folder.File("plain-out.png");
   ImageFile::Write(*photo, input);
   // 280 px: the circle's radius is 280 sqrt(2) = 396 px, under the half
@@ -106,7 +104,7 @@ TEST(ResultBorder, TheFisheyeCircleAndTheFrameComeOutSmoothAndAntiAliased) {
 
   ProgramRun program({"apply", "--action", action, "-o", output, input}, {});
   ASSERT_TRUE(program.Started());
-  const Testing::Finished run = program.Finish();
+  const testing::Finished run = program.Finish();
   ASSERT_EQ(run.status, 0) << run.errors;
   const auto result = ImageFile::Read(output);
   ASSERT_EQ(result->Width(), kWidth);

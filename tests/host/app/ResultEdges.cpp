@@ -1,12 +1,10 @@
 #include "tests/host/app/ResultEdges.h"
 
-#include "tests/support/StraightLineFit.h"
-
 #include <algorithm>
 #include <cmath>
 #include <limits>
 
-namespace Host::Testing {
+namespace Host::testing {
 
 namespace {
 
@@ -144,9 +142,4 @@ std::optional<Point2> FindEdge(const HostDocument& image, Point2 at, Point2 norm
   return Point2{at.x + t * normal.x, at.y + t * normal.y};
 }
 
-LineFit FitLine(const std::vector<Point2>& points) {
-  const Project::testing::StraightLineFit fit = Project::testing::FitStraightLine(points);
-  return {{std::cos(fit.angle), std::sin(fit.angle)}, fit.maxDeviation};
-}
-
-}  // namespace Host::Testing
+}  // namespace Host::testing

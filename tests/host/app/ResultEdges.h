@@ -1,20 +1,20 @@
 #pragma once
 
 // Measures taken on a corrected picture's pixels: where a photograph point
-// lands in the result, where an edge lies across a short profile, and how
-// far a run of points strays from one straight line. The result's geometry
-// comes from a CPU rendering of the solved mesh (which result pixel shows
-// which photograph point); the edges come from the pixels alone.
+// lands in the result, and where an edge lies across a short profile. The
+// result's geometry comes from a CPU rendering of the solved mesh (which
+// result pixel shows which photograph point); the edges come from the
+// pixels alone. How straight the edges found lie is FitStraightLine's.
 
 #include <array>
 #include <optional>
 #include <vector>
 
 #include "host/io/HostDocument.h"
-#include "tests/filter/render/ReferenceRender.h"
+#include "tests/support/ReferenceRender.h"
 #include "tools/synth/lib/Geometry.h"
 
-namespace Host::Testing {
+namespace Host::testing {
 
 using Synth::Point2;
 
@@ -52,13 +52,4 @@ class ResultMap {
 std::optional<Point2> FindEdge(const HostDocument& image, Point2 at, Point2 normal,
                                const Colour& step, double reach);
 
-// The least-squares straight line through points (total least squares, so
-// any direction fits): its unit direction and the largest distance of a
-// point from it.
-struct LineFit {
-  Point2 direction;
-  double largestDeviation = 0;
-};
-LineFit FitLine(const std::vector<Point2>& points);
-
-}  // namespace Host::Testing
+}  // namespace Host::testing

@@ -25,19 +25,20 @@
 #include <vector>
 
 #include "filter/PFilter.h"
-#include "params/ConstraintBlob.h"
-#include "params/Descriptor.h"
 #include "framework/plugin/CPluginEntry.h"
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"
 #include "host/platform/SystemInfo.h"
 #include "host/plugin/FilterRun.h"
 #include "host/plugin/HostRecord.h"
+#include "params/ConstraintBlob.h"
+#include "params/Descriptor.h"
 #include "solver/frame/Solver.h"
-#include "tests/filter/render/ReferenceRender.h"
 #include "tests/host/app/ProgramRun.h"
 #include "tests/host/app/ResultEdges.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/ReferenceRender.h"
+#include "tests/support/StraightLineFit.h"
+#include "tests/support/TestImages.h"
 #include "tools/synth/lib/ActionWriter.h"
 #include "tools/synth/lib/PhotoWriter.h"
 #include "tools/synth/lib/Render.h"
@@ -48,16 +49,16 @@ namespace {
 #ifdef ARCHWAY_REAL_MODULE
 
 using Project::testing::ReferenceImage;
-using Testing::Colour;
-using Testing::Environment;
-using Testing::Finished;
-using Testing::HasLine;
-using Testing::kHung;
-using Testing::Point2;
-using Testing::ProgramRun;
-using Testing::ReadBytes;
-using Testing::RunToEnd;
-using Testing::ScratchFolder;
+using testing::Colour;
+using testing::Environment;
+using testing::Finished;
+using testing::HasLine;
+using testing::kHung;
+using testing::Point2;
+using testing::ProgramRun;
+using testing::ReadBytes;
+using testing::RunToEnd;
+using testing::ScratchFolder;
 
 // ---- The same action solved in-process -----------------------------------------------
 
@@ -109,7 +110,7 @@ class SolveOnly : public RunObserver {
 std::optional<ReferenceImage> SolveInProcess(const std::string& photoPath,
                                              const Descriptor& action) {
   const ScratchFolder config;
-  const TestSupport::ScopedEnvironment home("XDG_CONFIG_HOME", config.Dir().c_str());
+  const Tarsa::testing::ScopedEnvironment home("XDG_CONFIG_HOME", config.Dir().c_str());
   const auto photo = ImageFile::Read(photoPath);
   KeptRun() = {photo.get(), std::nullopt};
   FilterRun::Options options;
@@ -219,8 +220,8 @@ Probe ProbeEdge(
     // The colour step across the edge, from under a pixel to each side, so
     // that a parallel edge a pixel and a half away stays out of it.
     const auto stepAt = [&](Point2 q) {
-      const Colour far = Testing::ColourAt(photo, {q.x + 0.75 * normal.x, q.y + 0.75 * normal.y});
-      const Colour near = Testing::ColourAt(photo, {q.x - 0.75 * normal.x, q.y - 0.75 * normal.y});
+      const Colour far = testing::ColourAt(photo, {q.x + 0.75 * normal.x, q.y + 0.75 * normal.y});
+      const Colour near = testing::ColourAt(photo, {q.x - 0.75 * normal.x, q.y - 0.75 * normal.y});
       return Colour{far[0] - near[0], far[1] - near[1], far[2] - near[2]};
     };
     const Colour step = stepAt(p);
@@ -253,7 +254,7 @@ Probe ProbeEdge(
     for (const Point2 d : {normal, tangent}) {
       for (const double sign : {-1.0, 1.0}) {
         const Colour c =
-            Testing::ColourAt(photo, {p.x + sign * kClear * d.x, p.y + sign * kClear * d.y});
+            testing::ColourAt(photo, {p.x + sign * kClear * d.x, p.y + sign * kClear * d.y});
         nearOutside |= std::max({c[0], c[1], c[2]}) < 0.03;
       }
     }
@@ -267,7 +268,7 @@ Probe ProbeEdge(
     if (across.x * (side->x - at->x) + across.y * (side->y - at->y) < 0)
       across = {-across.x, -across.y};
     constexpr double kReach = 3.0;  // pixels to either side of where the mesh puts the edge
-    if (const auto edge = Testing::FindEdge(picture, *at, across, step, kReach))
+    if (const auto edge = testing::FindEdge(picture, *at, across, step, kReach))
       probe.found.push_back(*edge);
   }
   return probe;
@@ -350,7 +351,7 @@ TEST_F(ScriptedRoad, ConstrainedEdgesComeOutStraightAndTheResultIsTheMeshDrawn) 
   // puts it.
   const std::vector<ConstrainedEdge> edges = ConstrainedEdges(action, generated);
   ASSERT_EQ(edges.size(), 6u) << "every line of the action is an edge of the scene";
-  Testing::ResultMap map(*reference);
+  testing::ResultMap map(*reference);
   double bentInPhoto = 0;
   for (size_t e = 0; e < edges.size(); ++e) {
     SCOPED_TRACE(::testing::Message() << "edge " << e);
@@ -360,21 +361,22 @@ TEST_F(ScriptedRoad, ConstrainedEdgesComeOutStraightAndTheResultIsTheMeshDrawn) 
     // A point may be missed where the result blurs a step into a neighbour
     // a pixel away; nearly all are found.
     EXPECT_GE(probe.found.size(), size_t(probe.probed) * 95 / 100);
-    const Testing::LineFit fit = Testing::FitLine(probe.found);
+    const Project::testing::StraightLineFit fit = Project::testing::FitStraightLine(probe.found);
     // What a straightened line is allowed: half a pixel of detection on
     // either side and half a pixel of the mesh's bend between its vertices.
     constexpr double kStraight = 1.5;
-    EXPECT_LE(fit.largestDeviation, kStraight);
+    EXPECT_LE(fit.maxDeviation, kStraight);
     if (edges[e].kind == kVerticalLine) {
       // A third of a pixel of lean along a 64-pixel edge (0.3 degrees); the
       // photograph's door edges lean ten times that.
       constexpr double kUpright = 0.005;
-      EXPECT_LT(std::fabs(fit.direction.x), kUpright) << fit.direction.x;
+      EXPECT_LT(std::fabs(std::cos(fit.angle)), kUpright) << fit.angle;
     }
     // The same measure on the photograph finds its curves bent: it can fail.
     const Probe inPhoto = ProbeEdge(*photo, *photo, edges[e].curve,
                                     [](Point2 p) { return std::optional<Point2>(p); });
-    bentInPhoto = std::max(bentInPhoto, Testing::FitLine(inPhoto.found).largestDeviation);
+    bentInPhoto =
+        std::max(bentInPhoto, Project::testing::FitStraightLine(inPhoto.found).maxDeviation);
   }
   // The floor's lines sag by tens of pixels in the fisheye photograph.
   EXPECT_GT(bentInPhoto, 10.0);
@@ -400,7 +402,7 @@ TEST_F(ScriptedRoad, TheSampleRoomComesOutCorrected) {
 
   const std::vector<ConstrainedEdge> edges = ConstrainedEdges(action, generated);
   ASSERT_GE(edges.size(), 12u) << "corners, wall edges and frames";
-  Testing::ResultMap map(*reference);
+  testing::ResultMap map(*reference);
   int plumb = 0;
   for (size_t e = 0; e < edges.size(); ++e) {
     SCOPED_TRACE(::testing::Message() << "edge " << e);
@@ -426,14 +428,15 @@ TEST_F(ScriptedRoad, TheSampleRoomComesOutCorrected) {
         *photo, *result, curve, [&](Point2 p) { return map.Place(p); }, nearOther);
     // Frames of a few tens of pixels leave few clear points.
     if (probe.found.size() < 20) continue;
-    const Testing::LineFit fit = Testing::FitLine(probe.found);
+    const Project::testing::StraightLineFit fit = Project::testing::FitStraightLine(probe.found);
     // Half a pixel of edge detection on either side, half of the mesh's bend.
     constexpr double kStraight = 1.5;
-    EXPECT_LE(fit.largestDeviation, kStraight);
+    EXPECT_LE(fit.maxDeviation, kStraight);
     if (edges[e].kind == kVerticalLine) {
       ++plumb;
       // A tenth of a degree.
-      const double lean = std::atan2(std::fabs(fit.direction.x), std::fabs(fit.direction.y));
+      const double lean =
+          std::atan2(std::fabs(std::cos(fit.angle)), std::fabs(std::sin(fit.angle)));
       EXPECT_LT(lean * 180 / M_PI, 0.1);
     }
   }
@@ -452,8 +455,8 @@ constexpr const char* kNo16Bit =
 // own environment: the refusal reaches the user and nothing is written.
 TEST_F(ScriptedRoad, WithoutTheOpenGLItNeedsTheModuleRefusesInItsOwnWords) {
   const std::string rgb = folder_.File("rgb.tif"), rgb48 = folder_.File("rgb48.tif");
-  ImageFile::Write(*Testing::PhotoLikeDocument(96, 64, ImageMode::kRgb, 1), rgb);
-  ImageFile::Write(*Testing::PhotoLikeDocument(96, 64, ImageMode::kRgb48, 2), rgb48);
+  ImageFile::Write(*testing::PhotoLikeDocument(96, 64, ImageMode::kRgb, 1), rgb);
+  ImageFile::Write(*testing::PhotoLikeDocument(96, 64, ImageMode::kRgb48, 2), rgb48);
   const std::string rgbBytes = ReadBytes(rgb), rgb48Bytes = ReadBytes(rgb48);
   const std::string listing = folder_.Listing();
   const std::string output = folder_.File("out.tif");
@@ -489,7 +492,7 @@ TEST_F(ScriptedRoad, CtrlCDuringTheRenderLeavesNoOutput) {
   // Large enough that the render takes over a second on a software
   // renderer; the program checks for Ctrl-C every 200 ms of it.
   const std::string input = folder_.File("large.tif"), output = folder_.File("out.tif");
-  ImageFile::Write(*Testing::PhotoLikeDocument(3000, 2000, ImageMode::kRgb, 3), input);
+  ImageFile::Write(*testing::PhotoLikeDocument(3000, 2000, ImageMode::kRgb, 3), input);
   const std::string before = ReadBytes(input);
   const std::string listing = folder_.Listing();
 

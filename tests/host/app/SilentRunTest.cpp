@@ -18,13 +18,13 @@ namespace {
 
 #ifdef ARCHWAY_REAL_MODULE
 
-using Testing::Environment;
-using Testing::Finished;
-using Testing::ProgramRun;
-using Testing::ReadBytes;
-using Testing::RunToEnd;
-using Testing::ScratchFolder;
-using Testing::WriteBytes;
+using testing::Environment;
+using testing::Finished;
+using testing::ProgramRun;
+using testing::ReadBytes;
+using testing::RunToEnd;
+using testing::ScratchFolder;
+using testing::WriteBytes;
 
 constexpr uint32_t Code(const char (&text)[5]) {
   return uint32_t(uint8_t(text[0])) << 24 | uint32_t(uint8_t(text[1])) << 16 |

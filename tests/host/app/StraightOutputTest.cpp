@@ -23,8 +23,8 @@ namespace {
 
 #ifdef ARCHWAY_REAL_MODULE
 
-using Testing::ProgramRun;
-using Testing::ScratchFolder;
+using testing::ProgramRun;
+using testing::ScratchFolder;
 
 struct Shot {
   const char* name;
@@ -57,7 +57,7 @@ TEST_P(StraightOutput, EveryConstrainedBarIsStraightToItsEndsAndLevelOrPlumb) {
 
   ProgramRun program({"apply", "--action", action, "-o", output, input}, {});
   ASSERT_TRUE(program.Started());
-  const Testing::Finished run = program.Finish();
+  const testing::Finished run = program.Finish();
   ASSERT_EQ(run.status, 0) << run.errors;
   const auto result = ImageFile::Read(output);
   const std::vector<Measure::MeasuredLine> lines = Measure::FindLines(*result);

@@ -9,17 +9,17 @@
 #include <vector>
 
 #include "host/io/HostError.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
-using Testing::LargestDifference;
-using Testing::PhotoLikeDocument;
-using Testing::RandomDocument;
-using Testing::ReadBytes;
-using Testing::ScratchFolder;
-using Testing::WriteBytes;
+using testing::LargestDifference;
+using testing::PhotoLikeDocument;
+using testing::RandomDocument;
+using testing::ReadBytes;
+using testing::ScratchFolder;
+using testing::WriteBytes;
 
 std::span<const uint8_t> Bytes(const char* text, size_t length) {
   return {reinterpret_cast<const uint8_t*>(text), length};

@@ -9,14 +9,14 @@
 
 #include "host/io/HostError.h"
 #include "host/io/ImageFile.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
-using Testing::LargestDifference;
-using Testing::RandomDocument;
-using Testing::ScratchFolder;
+using testing::LargestDifference;
+using testing::RandomDocument;
+using testing::ScratchFolder;
 
 // A PNG laid out by hand with libpng, to test the reader against files it did
 // not write. Rows are given as the file stores them: packed, big-endian.

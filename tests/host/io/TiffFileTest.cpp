@@ -8,14 +8,14 @@
 
 #include "host/io/HostError.h"
 #include "host/io/ImageFile.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
-using Testing::LargestDifference;
-using Testing::RandomDocument;
-using Testing::ScratchFolder;
+using testing::LargestDifference;
+using testing::RandomDocument;
+using testing::ScratchFolder;
 
 // A TIFF laid out by hand with libtiff, to test the reader against files it
 // did not write. Samples are given interleaved, as unsigned file values.

@@ -6,12 +6,12 @@
 #include "framework/plugin/HostFilterRecord.h"
 #include "host/plugin/BlockExchange.h"
 #include "host/plugin/HostCodes.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
-using Testing::RandomDocument;
+using testing::RandomDocument;
 
 // The sample of plane p at (x, y) in the handed-out block, as the module sees it.
 template <typename Sample>

@@ -4,13 +4,13 @@
 #include <vector>
 
 #include "host/plugin/DocumentChannels.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
 
 TEST(DocumentChannelsTest, ReadPixelsFillsAnInterleavedRectClippedToTheImage) {
-  auto document = Testing::RandomDocument(9, 6, ImageMode::kRgb48, true, 2);
+  auto document = testing::RandomDocument(9, 6, ImageMode::kRgb48, true, 2);
   DocumentChannels channels(*document);
   const Tarsa::HostDocumentInfo* info = channels.Info();
   EXPECT_EQ(info->targetTransparency, channels.Node(3));
@@ -37,7 +37,7 @@ TEST(DocumentChannelsTest, ReadPixelsFillsAnInterleavedRectClippedToTheImage) {
 }
 
 TEST(DocumentChannelsTest, PortsSuiteReadsLevelZeroAtTheDocumentsDepthOnly) {
-  auto document = Testing::RandomDocument(5, 5, ImageMode::kGray, false, 3);
+  auto document = testing::RandomDocument(5, 5, ImageMode::kGray, false, 3);
   DocumentChannels channels(*document);
   const auto* suite = DocumentChannels::PortsSuite();
   std::vector<uint8_t> plane(25);

@@ -6,7 +6,7 @@
 #include "host/io/HostError.h"
 #include "host/plugin/EnableExpression.h"
 #include "host/plugin/PluginModule.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
@@ -54,9 +54,9 @@ TEST(PluginModuleTest, ReadsTheModulesPropertiesWithoutLoadingIt) {
 }
 
 TEST(PluginModuleTest, FilesThatAreNotModulesAreRefusedByName) {
-  Testing::ScratchFolder folder;
+  testing::ScratchFolder folder;
   const std::string text = folder.File("notes.so");
-  Testing::WriteBytes(text, "not a module");
+  testing::WriteBytes(text, "not a module");
   for (const std::string& path : {text, folder.File("missing.so")}) {
     try {
       PluginModule::Inspect(path);

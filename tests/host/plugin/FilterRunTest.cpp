@@ -3,7 +3,7 @@
 #include "framework/plugin/HostSuites.h"
 #include "host/plugin/FilterRun.h"
 #include "host/plugin/PluginModule.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
@@ -27,8 +27,8 @@ class CountingObserver : public RunObserver {
 TEST(FilterRunTest, ServesTheRecordToAModuleInProcess) {
   auto module = PluginModule::Inspect(ARCHWAY_FAKE_MODULE);
   module->Load();
-  auto document = Testing::RandomDocument(11, 7, ImageMode::kRgb48, true, 21);
-  const auto original = Testing::RandomDocument(11, 7, ImageMode::kRgb48, true, 21);
+  auto document = testing::RandomDocument(11, 7, ImageMode::kRgb48, true, 21);
+  const auto original = testing::RandomDocument(11, 7, ImageMode::kRgb48, true, 21);
 
   FilterRun::Options options;
   options.host.title = "hall.tif";

@@ -10,7 +10,7 @@
 #include "host/plugin/DocumentChannels.h"
 #include "host/plugin/HostRecord.h"
 #include "host/plugin/RunObserver.h"
-#include "tests/host/io/TestImages.h"
+#include "tests/support/TestImages.h"
 
 namespace Host {
 namespace {
@@ -22,8 +22,8 @@ class QuietObserver : public RunObserver {
 };
 
 TEST(HostRecordTest, ReadsSeeTheDocumentAsTheRunFoundItWhileWritesChangeIt) {
-  auto document = Testing::RandomDocument(6, 4, ImageMode::kGray, false, 5);
-  const auto before = Testing::RandomDocument(6, 4, ImageMode::kGray, false, 5);
+  auto document = testing::RandomDocument(6, 4, ImageMode::kGray, false, 5);
+  const auto before = testing::RandomDocument(6, 4, ImageMode::kGray, false, 5);
   QuietObserver observer;
   HostRecord record(*document, {}, observer);
   Tarsa::HostFilterRecord& r = *record.Record();

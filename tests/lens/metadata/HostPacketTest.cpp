@@ -47,7 +47,7 @@ PhotoInfo LoadThroughHost(const std::string* path) {
 }
 
 TEST(HostPacketTest, ExifAndEmbeddedXmpOfAnImageFileReachThePhoto) {
-  TestSupport::ScratchFolder folder;
+  Tarsa::testing::ScratchFolder folder;
   const std::string path = folder.File("photo.jpg");
   Host::ImageFile::Write(*Host::HostDocument::Create(60, 40, Host::ImageMode::kRgb), path);
   {
@@ -80,7 +80,7 @@ TEST(HostPacketTest, ExifAndEmbeddedXmpOfAnImageFileReachThePhoto) {
 }
 
 TEST(HostPacketTest, WithoutMetadataThePhotoIsUnknown) {
-  TestSupport::ScratchFolder folder;
+  Tarsa::testing::ScratchFolder folder;
   const std::string path = folder.File("plain.png");
   Host::ImageFile::Write(*Host::HostDocument::Create(60, 40, Host::ImageMode::kRgb), path);
   for (const std::string* source : {&path, static_cast<const std::string*>(nullptr)}) {

@@ -8,7 +8,7 @@
 
 #include "lens/metadata/PXmpMeta.h"
 #include "lens/metadata/PhotoInfo.h"
-#include "tests/lens/metadata/MetadataTestSupport.h"
+#include "tests/support/MetadataPackets.h"
 
 namespace Project::testing {
 namespace {

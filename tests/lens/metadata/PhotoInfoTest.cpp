@@ -5,7 +5,7 @@
 #include <cmath>
 #include <string>
 
-#include "tests/lens/metadata/MetadataTestSupport.h"
+#include "tests/support/MetadataPackets.h"
 
 namespace Project::testing {
 namespace {

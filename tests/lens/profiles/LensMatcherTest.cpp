@@ -12,8 +12,8 @@
 #include "host/plugin/HostBuffers.h"
 #include "host/plugin/LensProfileService.h"
 #include "lens/camera/PRadialDistortCameraModel.h"
-#include "tests/framework/process/RecordingPresenter.h"
-#include "tests/lens/metadata/MetadataTestSupport.h"
+#include "tests/support/RecordingPresenter.h"
+#include "tests/support/MetadataPackets.h"
 #include "tests/support/TestSupport.h"
 
 namespace Project::testing {
@@ -161,7 +161,7 @@ TEST(LensMatcherTest, RefusalsComeBeforeTheHostIsAsked) {
     EXPECT_EQ(CountingService::queries, 0);
 
     // Warned, the failure is shown once and then cleared.
-    Tarsa::ScopedRecorder recorder;
+    Tarsa::testing::ScopedRecorder recorder;
     EXPECT_FALSE(matcher.MatchProfile(true));
     ASSERT_EQ(recorder.texts.size(), 1u);
     EXPECT_EQ(recorder.texts[0], Tarsa::ResolveText(PLensMatcher::TextOf(c.code)).Str());
@@ -208,7 +208,7 @@ TEST(LensMatcherTest, CropRatio) {
 
 TEST(LensMatcherTest, MatchesThroughTheHostsService) {
   // The shipped profiles in the user's folder, with a file that is none.
-  TestSupport::ScratchFolder home;
+  Tarsa::testing::ScratchFolder home;
   const std::filesystem::path folder = home.Dir() + "archway/profiles";
   std::filesystem::create_directories(folder);
   const std::filesystem::path shipped =
@@ -217,8 +217,8 @@ TEST(LensMatcherTest, MatchesThroughTheHostsService) {
   for (const auto& file : std::filesystem::directory_iterator(shipped)) {
     std::filesystem::copy_file(file.path(), folder / file.path().filename());
   }
-  TestSupport::WriteBytes(folder / "broken.xmp", "<rdf:RDF><qm:Came");
-  TestSupport::ScopedEnvironment data("XDG_DATA_HOME", home.Dir().c_str());
+  Tarsa::testing::WriteBytes(folder / "broken.xmp", "<rdf:RDF><qm:Came");
+  Tarsa::testing::ScopedEnvironment data("XDG_DATA_HOME", home.Dir().c_str());
 
   // A 1.5 crop body with the full-frame 14 mm lens.
   FakeRun run;

@@ -13,7 +13,7 @@
 #include "lens/camera/PFisheyeCameraModel.h"
 #include "lens/camera/PRadialDistortCameraModel.h"
 #include "lens/camera/PTangentialDistortCameraModel.h"
-#include "tests/lens/metadata/MetadataTestSupport.h"
+#include "tests/support/MetadataPackets.h"
 #include "tests/support/TestSupport.h"
 #include "tools/lensprofile/lib/Calibration.h"
 #include "tools/lensprofile/lib/ProfileXmp.h"
@@ -119,7 +119,7 @@ TEST(LensProfilesTest, ShippedProfilesAreSound) {
   for (const auto& file : std::filesystem::directory_iterator(folder)) {
     SCOPED_TRACE(file.path().string());
     PLensProfiles profiles;
-    EXPECT_TRUE(Parse(profiles, TestSupport::ReadBytes(file.path().string())));
+    EXPECT_TRUE(Parse(profiles, Tarsa::testing::ReadBytes(file.path().string())));
     EXPECT_GE(profiles.Count(), 2u);
     ++files;
   }

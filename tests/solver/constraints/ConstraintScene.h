@@ -13,7 +13,7 @@ namespace Project {
 
 // The filter's side: a photo of 1200 x 800 shown in a preview of 600 x 400,
 // with the source shown so that curves come in photo pixels.
-class SceneContext : public SolverTestContext {
+class SceneContext : public testing::SolverTestContext {
  public:
   SceneContext(std::int32_t model, float focal) : SolverTestContext(kWidth, kHeight, model, focal) {
     settings.regularizerModel = PSettings::kRegularizerStereographic;

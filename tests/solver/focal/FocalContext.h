@@ -5,14 +5,9 @@
 namespace Project {
 
 // A photo of 1200 x 800 at the default settings but for the test context's.
-class FocalContext : public SolverTestContext {
+class FocalContext : public testing::SolverTestContext {
  public:
-  FocalContext()
-      : SolverTestContext(kWidth, kHeight, PSettings(kWidth).projectionModel,
-                          PSettings(kWidth).focalLength) {
-    settings.meshResolution = PSettings(kWidth).meshResolution;
-    settings.autoRotate = PSettings(kWidth).autoRotate;
-  }
+  FocalContext() : SolverTestContext(kWidth, kHeight) {}
 
   static constexpr std::int32_t kWidth = 1200;
   static constexpr std::int32_t kHeight = 800;

@@ -10,7 +10,7 @@
 namespace Project {
 namespace {
 
-using TestContext = SolverTestContext;
+using TestContext = testing::SolverTestContext;
 
 // A solved perspective photo: the mesh, its boxes and every conversion,
 // each checked against its inverse or the mesh itself.

@@ -5,9 +5,9 @@
 
 #include <algorithm>
 
-#include "tests/solver/quality/QualityScene.h"
+#include "tests/support/QualityMeasures.h"
 
-namespace Project::quality {
+namespace Project::testing {
 namespace {
 
 // What a straightened line and a polygon are held to, in output pixels and
@@ -108,4 +108,4 @@ TEST(LineSolveQuality, ALoneLineMeetsTheAimsToItsEnds) {
 }
 
 }  // namespace
-}  // namespace Project::quality
+}  // namespace Project::testing

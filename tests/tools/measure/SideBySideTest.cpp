@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include "tests/support/TestImages.h"
 #include "tools/measure/lib/MeasureError.h"
 
 namespace Measure {
@@ -11,11 +12,7 @@ namespace {
 // light gap between; gray comes out as equal RGB.
 TEST(SideBySide, PutsBothAtTheShorterHeight) {
   auto left = Host::HostDocument::Create(30, 20, Host::ImageMode::kRgb);
-  for (int y = 0; y < 20; ++y) {
-    for (int x = 0; x < 30; ++x) {
-      for (int p = 0; p < 3; ++p) left->SetSample(p, x, y, (x * 7 + y * 3 + p * 50) % 256);
-    }
-  }
+  Host::testing::FillDetail(*left);
   auto right = Host::HostDocument::Create(20, 40, Host::ImageMode::kGray16);
   for (int y = 0; y < 40; ++y) {
     for (int x = 0; x < 20; ++x) right->SetSample(0, x, y, x < 10 ? 0 : Host::kMax16);
