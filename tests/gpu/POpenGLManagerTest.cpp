@@ -14,10 +14,10 @@
 namespace Project {
 namespace {
 
+using Tarsa::testing::ReadBytes;
 using testing::ForeignContext;
 using testing::kShaderFile;
 using testing::ReadPixels;
-using Tarsa::testing::ReadBytes;
 
 constexpr int kSize = POpenGLManager::kSurfaceSize;
 

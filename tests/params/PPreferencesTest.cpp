@@ -2,10 +2,10 @@
 
 #include <gtest/gtest.h>
 
-#include "params/PreferencesDirectory.h"
 #include "framework/files/CFile.h"
 #include "framework/files/CFileContainer.h"
 #include "framework/files/CMemoryContainer.h"
+#include "params/PreferencesDirectory.h"
 #include "tests/params/TestFiles.h"
 
 namespace Project {

@@ -9,9 +9,9 @@
 #include <cmath>
 #include <string>
 
-#include "params/Descriptor.h"
 #include "host/actions/ActionFile.h"
 #include "host/io/ImageFile.h"
+#include "params/Descriptor.h"
 #include "tests/host/app/ProgramRun.h"
 #include "tools/measure/lib/FindLines.h"
 #include "tools/synth/lib/ActionWriter.h"

@@ -12,8 +12,8 @@
 #include "host/plugin/HostBuffers.h"
 #include "host/plugin/LensProfileService.h"
 #include "lens/camera/PRadialDistortCameraModel.h"
-#include "tests/support/RecordingPresenter.h"
 #include "tests/support/MetadataPackets.h"
+#include "tests/support/RecordingPresenter.h"
 #include "tests/support/TestSupport.h"
 
 namespace Project::testing {
