@@ -88,6 +88,16 @@ void InkLine(cairo_t* cr, double x0, double y0, double x1, double y1, double wid
   cairo_stroke(cr);
 }
 
+// The path of an arrowhead: a triangle with its tip at (x, y), pointing
+// along the unit direction (dx, dy).
+void HeadPath(cairo_t* cr, double x, double y, double dx, double dy, double length,
+              double halfWidth) {
+  cairo_move_to(cr, x, y);
+  cairo_line_to(cr, x - dx * length - dy * halfWidth, y - dy * length + dx * halfWidth);
+  cairo_line_to(cr, x - dx * length + dy * halfWidth, y - dy * length - dx * halfWidth);
+  cairo_close_path(cr);
+}
+
 // A line with an arrowhead at each end, ink on a white outline. Heads are
 // filled triangles whose tips lie at the line's ends.
 void DoubleArrow(cairo_t* cr, double x0, double y0, double x1, double y1, double head = 4.5,
@@ -97,16 +107,8 @@ void DoubleArrow(cairo_t* cr, double x0, double y0, double x1, double y1, double
   const double uy = (y1 - y0) / length;
   const auto heads = [&] {
     cairo_new_path(cr);
-    for (const int end : {0, 1}) {
-      const double tx = end ? x1 : x0;
-      const double ty = end ? y1 : y0;
-      const double dx = end ? ux : -ux;
-      const double dy = end ? uy : -uy;
-      cairo_move_to(cr, tx, ty);
-      cairo_line_to(cr, tx - dx * head - dy * halfWidth, ty - dy * head + dx * halfWidth);
-      cairo_line_to(cr, tx - dx * head + dy * halfWidth, ty - dy * head - dx * halfWidth);
-      cairo_close_path(cr);
-    }
+    HeadPath(cr, x0, y0, -ux, -uy, head, halfWidth);
+    HeadPath(cr, x1, y1, ux, uy, head, halfWidth);
   };
   const auto shaft = [&] {
     cairo_new_path(cr);
@@ -131,16 +133,8 @@ void DoubleArrowInk(cairo_t* cr, double x0, double y0, double x1, double y1, dou
   const double uy = (y1 - y0) / length;
   SetColour(cr, kInk);
   cairo_new_path(cr);
-  for (const int end : {0, 1}) {
-    const double tx = end ? x1 : x0;
-    const double ty = end ? y1 : y0;
-    const double dx = end ? ux : -ux;
-    const double dy = end ? uy : -uy;
-    cairo_move_to(cr, tx, ty);
-    cairo_line_to(cr, tx - dx * head - dy * halfWidth, ty - dy * head + dx * halfWidth);
-    cairo_line_to(cr, tx - dx * head + dy * halfWidth, ty - dy * head - dx * halfWidth);
-    cairo_close_path(cr);
-  }
+  HeadPath(cr, x0, y0, -ux, -uy, head, halfWidth);
+  HeadPath(cr, x1, y1, ux, uy, head, halfWidth);
   cairo_fill(cr);
   InkLine(cr, x0 + ux * (head - 0.5), y0 + uy * (head - 0.5), x1 - ux * (head - 0.5),
           y1 - uy * (head - 0.5), 1.8);
@@ -268,26 +262,23 @@ void Rotation(cairo_t* cr, double degrees) {
   cairo_translate(cr, 16, 16);
   cairo_rotate(cr, degrees * kPi / 180);
   const double radius = 12;
-  const double span = 34 * kPi / 180;
-  const double head = 4.8;
-  const double halfWidth = 3.8;
+  const double span = 30 * kPi / 180;
+  const double head = 5.6;
+  const double halfWidth = 3.7;
   const auto arc = [&] {
     cairo_new_path(cr);
-    cairo_arc(cr, -radius, 0, radius, -span + 0.2, span - 0.2);
+    cairo_arc(cr, -radius, 0, radius, -span, span);
   };
+  // Each head sits on an end of the arc and points on along it.
   const auto heads = [&] {
     cairo_new_path(cr);
     for (const double sign : {-1.0, 1.0}) {
       const double a = sign * span;
+      const double dx = -std::sin(a) * sign;
+      const double dy = std::cos(a) * sign;
       const double ex = -radius + radius * std::cos(a);
       const double ey = radius * std::sin(a);
-      // The tangent, pointing away from the arc's middle.
-      const double tx = -std::sin(a) * sign;
-      const double ty = std::cos(a) * sign;
-      cairo_move_to(cr, ex + tx * head, ey + ty * head);
-      cairo_line_to(cr, ex - ty * halfWidth, ey + tx * halfWidth);
-      cairo_line_to(cr, ex + ty * halfWidth, ey - tx * halfWidth);
-      cairo_close_path(cr);
+      HeadPath(cr, ex + dx * head, ey + dy * head, dx, dy, head, halfWidth);
     }
   };
   SetColour(cr, kPaper);
@@ -352,14 +343,24 @@ std::vector<IconArt> CursorArt() {
   }
   // Over a point that can be dragged: a ring with four ways out.
   art.push_back(Numbered(26070, 16, 16, [](cairo_t* cr) {
-    Arrows(cr, {{16, 5, 16, 11}, {16, 21, 16, 27}, {5, 16, 11, 16}, {21, 16, 27, 16}});
-    cairo_new_path(cr);
-    cairo_arc(cr, 16, 16, 2.6, 0, 2 * kPi);
+    const double ways[][2] = {{0, -1}, {1, 0}, {0, 1}, {-1, 0}};
+    const auto heads = [&] {
+      cairo_new_path(cr);
+      for (const auto& w : ways) HeadPath(cr, 16 + 11 * w[0], 16 + 11 * w[1], w[0], w[1], 4.6, 3.8);
+    };
     SetColour(cr, kPaper);
-    cairo_set_line_width(cr, 3.6);
+    heads();
+    cairo_set_line_width(cr, 2.4);
     cairo_stroke_preserve(cr);
+    cairo_fill(cr);
+    cairo_arc(cr, 16, 16, 2.8, 0, 2 * kPi);
+    cairo_set_line_width(cr, 4.2);
+    cairo_stroke(cr);
     SetColour(cr, kInk);
-    cairo_set_line_width(cr, 1.4);
+    heads();
+    cairo_fill(cr);
+    cairo_arc(cr, 16, 16, 2.8, 0, 2 * kPi);
+    cairo_set_line_width(cr, 1.6);
     cairo_stroke(cr);
   }));
   // Drawing a polygon: add a corner, or close the shape on its first one.
