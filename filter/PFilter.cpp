@@ -60,6 +60,9 @@ constexpr const char* kDialogMissingText =
 constexpr const char* kUnusableValueText =
     "$$$/Archway/Error/UnusableValue=The action's value ^0 for '^1' cannot be used: ^2.";
 constexpr const char* kNotANumberText = "$$$/Archway/Error/NotANumber=it is not a finite number";
+constexpr const char* kUnknownValueText =
+    "$$$/Archway/Error/UnknownValue=The action's value '^0' for '^1' cannot be used: it is not "
+    "one of ^2.";
 constexpr const char* kOutsideText = "$$$/Archway/Error/Outside=it must lie between ^0 and ^1";
 constexpr const char* kFocalOutsideText =
     "$$$/Archway/Error/FocalOutside=the focal length must lie between ^0 and ^1 pixels for this "
@@ -196,7 +199,7 @@ bool PFilter::DoStart() {
       if (IsInteractive()) {
         ResolveProjectionModel(PSettings::kModelFisheye, false, false);
       } else {
-        ResolveUnsaid(keysRead_);
+        ResolveUnsaid(descriptorRead_.keys);
       }
       PrepareSolver();
       if (IsInteractive()) {
@@ -220,7 +223,7 @@ bool PFilter::DoStart() {
       settings = local;
       ReadDescriptor(settings);  // a descriptor that cannot be read leaves the defaults
       RefuseUnusableValues();
-      ResolveUnsaid(keysRead_);
+      ResolveUnsaid(descriptorRead_.keys);
       PrepareSolver();
       Solve();
       if (hub.RenderFinalSilent()) {
@@ -325,6 +328,18 @@ void PFilter::ResolveUnsaid(const std::vector<std::uint32_t>& said) {
 
 void PFilter::RefuseUnusableValues() {
   const PSettings& s = Settings();
+  // A scripted run refuses an enumerated value it does not know rather than
+  // quietly correcting with the fallback model; the dialog shows the
+  // fallback, where the user sees it.
+  if (!IsInteractive()) {
+    for (const DescriptorReport::Unknown& unknown : descriptorRead_.unknownValues) {
+      throw Tarsa::CError(Tarsa::ResolveText(kUnknownValueText)
+                              .Replace(0, Tarsa::FourCharText(unknown.value))
+                              .Replace(1, Tarsa::FourCharText(unknown.key))
+                              .Replace(2, KnownValuesText(unknown.key))
+                              .Str());
+    }
+  }
   const auto refuse = [](const char* key, double value, const Tarsa::CString& why) {
     const Tarsa::CString text = Tarsa::ResolveText(kUnusableValueText)
                                     .Replace(0, Tarsa::NumberToText(value, 6, false))
@@ -364,7 +379,7 @@ bool PFilter::ReadDescriptor(PSettings& target) {
   const auto* script = static_cast<const Tarsa::HostScriptBlock*>(record->scriptBlock);
   std::vector<std::uint8_t> constraintData;
   const bool read = Project::ReadDescriptor(DescriptorSuite(), script->descriptor, target,
-                                            constraintData, &keysRead_);
+                                            constraintData, &descriptorRead_);
   ConstraintBlobAdapter::ReadBlob(Constraints(), constraintData.data(), constraintData.size());
   return read;
 }

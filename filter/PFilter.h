@@ -11,6 +11,7 @@
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/profiles/PLensMatcher.h"
 #include "lens/sphere/PhotoToSphere.h"
+#include "params/Descriptor.h"
 #include "params/PPreferences.h"
 #include "params/PSettings.h"
 #include "solver/constraints/ConstraintList.h"
@@ -177,7 +178,7 @@ class PFilter : public Tarsa::CQuillmarkFilter,
   const Tarsa::HostLensProfilesSuite* lensSuite_ = nullptr;
   std::unique_ptr<PLensMatcher> lensMatcher_;
   // The keys the last ReadDescriptor found values for.
-  std::vector<std::uint32_t> keysRead_;
+  DescriptorReport descriptorRead_;
   float cropRatio_ = 0;
 };
 

@@ -1,5 +1,8 @@
 #include "params/Descriptor.h"
 
+#include <algorithm>
+#include <span>
+
 #include <cmath>
 #include <limits>
 #include <new>
@@ -96,9 +99,23 @@ class OwnedDescriptor {
   HostDescriptor descriptor_ = nullptr;
 };
 
-// Reads the value under one key into target; false when a call failed.
+namespace V = DescriptorValue;
+constexpr std::uint32_t kKnownProjections[] = {V::kFisheye, V::kPerspective, V::kPanorama,
+                                               V::kAutoProjection, V::kFullSpherical};
+constexpr std::uint32_t kKnownRegularizers[] = {V::kStereographic, V::kMercator, V::kPanini,
+                                                V::kAutoRegularizer};
+
+std::span<const std::uint32_t> KnownValues(std::uint32_t key) {
+  if (key == DescriptorKey::kProjectionModel) return kKnownProjections;
+  if (key == DescriptorKey::kRegularizerModel) return kKnownRegularizers;
+  return {};
+}
+
+// Reads the value under one key into target; false when a call failed. An
+// enumerated value the reader does not know goes to unknown.
 bool ReadKey(const HostDescriptorSuite& suite, HostDescriptor d, std::uint32_t key,
-             PSettings& target, std::vector<std::uint8_t>& constraintData) {
+             PSettings& target, std::vector<std::uint8_t>& constraintData,
+             std::vector<DescriptorReport::Unknown>& unknown) {
   namespace K = DescriptorKey;
   std::int32_t integer = 0;
   double real = 0;
@@ -122,13 +139,16 @@ bool ReadKey(const HostDescriptorSuite& suite, HostDescriptor d, std::uint32_t k
       return true;
     }
     case K::kProjectionModel:
+    case K::kRegularizerModel: {
       if (!Call(suite.getEnumerated, d, key, &type, &value)) return false;
-      target.projectionModel = ProjectionFromValue(value);
+      if (key == K::kProjectionModel) target.projectionModel = ProjectionFromValue(value);
+      if (key == K::kRegularizerModel) target.regularizerModel = RegularizerFromValue(value);
+      const auto known = KnownValues(key);
+      if (std::find(known.begin(), known.end(), value) == known.end()) {
+        unknown.push_back({key, value});
+      }
       return true;
-    case K::kRegularizerModel:
-      if (!Call(suite.getEnumerated, d, key, &type, &value)) return false;
-      target.regularizerModel = RegularizerFromValue(value);
-      return true;
+    }
     case K::kImageScale:
       if (!Call(suite.getInteger, d, key, &integer)) return false;
       target.imageScale = integer;
@@ -155,10 +175,11 @@ bool ReadKey(const HostDescriptorSuite& suite, HostDescriptor d, std::uint32_t k
 }  // namespace
 
 bool ReadDescriptor(const HostDescriptorSuite* suite, Tarsa::HostHandle handle, PSettings& target,
-                    std::vector<std::uint8_t>& constraintData,
-                    std::vector<std::uint32_t>* keysRead) {
+                    std::vector<std::uint8_t>& constraintData, DescriptorReport* report) {
   constraintData.clear();
-  if (keysRead != nullptr) keysRead->clear();
+  DescriptorReport ignored;
+  DescriptorReport& out = report != nullptr ? *report : ignored;
+  out = DescriptorReport();
   if (suite == nullptr || handle == nullptr) return false;
   OwnedDescriptor reader(*suite);
   if (!Call(suite->fromHandle, handle, reader.Out())) return false;
@@ -171,13 +192,22 @@ bool ReadDescriptor(const HostDescriptorSuite* suite, Tarsa::HostHandle handle, 
       succeeded = false;
       continue;
     }
-    if (!ReadKey(*suite, reader.Get(), key, target, constraintData)) {
+    if (!ReadKey(*suite, reader.Get(), key, target, constraintData, out.unknownValues)) {
       succeeded = false;
-    } else if (keysRead != nullptr) {
-      keysRead->push_back(key);
+    } else {
+      out.keys.push_back(key);
     }
   }
   return succeeded;
+}
+
+std::string KnownValuesText(std::uint32_t key) {
+  std::string text;
+  for (const std::uint32_t value : KnownValues(key)) {
+    if (!text.empty()) text += ", ";
+    text += Tarsa::FourCharText(value);
+  }
+  return text;
 }
 
 Tarsa::HostHandle WriteDescriptor(const HostDescriptorSuite* suite, const PSettings& source,

@@ -2,11 +2,12 @@
 
 #include <cstdint>
 #include <span>
+#include <string>
 #include <vector>
 
-#include "params/PSettings.h"
 #include "framework/plugin/HostSuites.h"
 #include "framework/resource/FourCharCode.h"
+#include "params/PSettings.h"
 
 // The scripting descriptor: the keyed record through which the host records
 // a run's parameters and replays them silently. Both directions take the
@@ -47,11 +48,23 @@ inline constexpr std::uint32_t kAutoRegularizer = Tarsa::FourCharCode("autR");
 // descriptor's order; unknown keys are ignored. constraintData is emptied and
 // then receives the bytes under cnsD, if any. False when the suite or handle
 // is missing or any suite call failed; what was read before still stands.
-// The reader made from the handle is freed on every path. keysRead, when
-// given, receives the keys whose values were read.
+// The reader made from the handle is freed on every path. What was read is
+// reported, when asked for: the keys whose values were read, and the
+// enumerated values this reader does not know (read as the fallback).
+struct DescriptorReport {
+  std::vector<std::uint32_t> keys;
+  struct Unknown {
+    std::uint32_t key = 0;
+    std::uint32_t value = 0;
+  };
+  std::vector<Unknown> unknownValues;
+};
 bool ReadDescriptor(const Tarsa::HostDescriptorSuite* suite, Tarsa::HostHandle handle,
                     PSettings& target, std::vector<std::uint8_t>& constraintData,
-                    std::vector<std::uint32_t>* keysRead = nullptr);
+                    DescriptorReport* report = nullptr);
+
+// The enumerated values the reader knows for a key, as text ("fisP, perP").
+std::string KnownValuesText(std::uint32_t key);
 
 // A new descriptor of source's scripted parameters, turned into a handle for
 // the record's script block; cnsD only when constraintData is not empty.

@@ -9,9 +9,11 @@ namespace Host {
 
 // What a module's scripting terminology lets an action say to it, as the
 // host checks a recorded action before replaying it: a parameter the
-// terminology declares must have its declared type, a float must be a finite
-// number, and an enumerated value must be one the enumeration lists. Keys the
-// terminology does not declare pass unchecked; the module reads those itself.
+// terminology declares must have its declared type (an enumerated one its
+// enumeration's type), and a float must be a finite number. Which enumerated
+// values it takes, and keys the terminology does not declare, the module
+// judges itself: a stored action may carry a value the terminology does not
+// offer.
 // Holds its own copy of the terminology.
 class ActionTerms {
  public:

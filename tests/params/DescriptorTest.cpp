@@ -36,9 +36,9 @@ const Tarsa::HostDescriptorSuite kSuite = [] {
 
 // Reads descriptor through a handle, as the record's script block holds it.
 bool Read(const Host::Descriptor& descriptor, PSettings& s, Bytes& blob,
-          const Tarsa::HostDescriptorSuite* suite = &kSuite) {
+          const Tarsa::HostDescriptorSuite* suite = &kSuite, DescriptorReport* report = nullptr) {
   const Tarsa::HostHandle handle = MemoryHandles::FromBytes(descriptor.ToBytes());
-  const bool read = ReadDescriptor(suite, handle, s, blob);
+  const bool read = ReadDescriptor(suite, handle, s, blob, report);
   MemoryHandles::Dispose(handle);
   return read;
 }
@@ -50,6 +50,33 @@ Host::Descriptor Write(const PSettings& source, const Bytes& blob) {
   Host::Descriptor written = Host::Descriptor::FromBytes(MemoryHandles::Bytes(handle));
   MemoryHandles::Dispose(handle);
   return written;
+}
+
+// Unknown enumerated values read as the fallbacks, and are reported so that
+// a scripted run can refuse them; fusP and panP, which stored actions carry,
+// are known.
+TEST(Descriptor, ReportsTheKeysReadAndTheEnumeratedValuesItDoesNotKnow) {
+  Host::Descriptor stored;
+  stored.PutEnumerated(Key::kProjectionModel, Key::kProjectionModel, Tarsa::FourCharCode("xxxx"));
+  stored.PutEnumerated(Key::kRegularizerModel, Key::kRegularizerModel, Value::kMercator);
+  stored.PutFloat(Key::kFocalLength, 900.0);
+  PSettings s(kWidth);
+  Bytes blob;
+  DescriptorReport report;
+  ASSERT_TRUE(Read(stored, s, blob, &kSuite, &report));
+  EXPECT_EQ(s.projectionModel, PSettings::kModelFisheye);
+  EXPECT_EQ(report.keys, (std::vector<std::uint32_t>{Key::kProjectionModel, Key::kRegularizerModel,
+                                                     Key::kFocalLength}));
+  ASSERT_EQ(report.unknownValues.size(), 1u);
+  EXPECT_EQ(report.unknownValues[0].key, Key::kProjectionModel);
+  EXPECT_EQ(report.unknownValues[0].value, Tarsa::FourCharCode("xxxx"));
+  EXPECT_EQ(KnownValuesText(Key::kProjectionModel), "fisP, perP, panP, autP, fusP");
+
+  for (const std::uint32_t kept : {Value::kFullSpherical, Value::kPanorama}) {
+    stored.PutEnumerated(Key::kProjectionModel, Key::kProjectionModel, kept);
+    ASSERT_TRUE(Read(stored, s, blob, &kSuite, &report));
+    EXPECT_TRUE(report.unknownValues.empty());
+  }
 }
 
 TEST(Descriptor, ReadsEveryKeyAndIgnoresOthers) {

@@ -28,8 +28,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (handle == nullptr) return 0;
   Project::PSettings settings(640);
   std::vector<std::uint8_t> constraints;
-  std::vector<std::uint32_t> keys;
-  Project::ReadDescriptor(Host::DescriptorSuite::Table(), handle, settings, constraints, &keys);
+  Project::DescriptorReport report;
+  Project::ReadDescriptor(Host::DescriptorSuite::Table(), handle, settings, constraints, &report);
   Host::MemoryHandles::Dispose(handle);
   return 0;
 }

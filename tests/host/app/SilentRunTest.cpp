@@ -117,9 +117,10 @@ TEST_F(SilentRun, AnActionWithoutAFocalLengthOwesNothingToTheRunBefore) {
 }
 
 // Values no run can use: refused at the start with a failing status and
-// nothing written. What the module's terminology rules out, the host refuses
-// at the action's line; what only the photo rules out, the module refuses in
-// its own words. Either way the key is named.
+// nothing written. What the module's terminology rules out (a float that is
+// not a number), the host refuses at the action's line; what only the module
+// or the photo can judge, the module refuses in its own words. Either way
+// the key is named.
 TEST_F(SilentRun, UnusableValuesAreRefusedBeforeAnythingIsWritten) {
   const std::string photo = Photo("photo", Synth::ProjectionKind::kFisheyeEquisolid, 10.0, 1.0);
   const std::string before = ReadBytes(photo);
@@ -130,7 +131,9 @@ TEST_F(SilentRun, UnusableValuesAreRefusedBeforeAnythingIsWritten) {
   const Case cases[] = {
       {"focL float nan", "line 3: 'focL' (Focal Length) must be a finite number"},
       {"focL float -inf", "line 3: 'focL' (Focal Length) must be a finite number"},
-      {"regM enumerated regM pano", "line 3: 'pano' is not a value of 'regM'"},
+      {"regM enumerated regM pano",
+       "The action's value 'pano' for 'regM' cannot be used: it is not one of steR, merR, "
+       "panR, autR."},
       {"focL float 1e9", "for 'focL' cannot be used"},
       {"focL float 0.5", "for 'focL' cannot be used"},
       {"CrpF float 0", "for 'CrpF' cannot be used"},
