@@ -9,6 +9,7 @@
 #include "framework/pixels/SampleInterleave.h"
 
 #if defined(__x86_64__) || defined(__i386__)
+#include <cpuid.h>
 #include <immintrin.h>
 #define TARSA_X86_TEXELS 1
 #endif
@@ -72,8 +73,18 @@ __attribute__((target("f16c"))) void InterleaveHalf(const CTexelPacker::ChannelR
   }
 }
 
+// Asked of the processor directly, since clang 14's __builtin_cpu_supports
+// knows no "f16c": the instructions are there and, as they use the AVX
+// registers, the system saves those registers.
 bool HasHalves() {
-  static const bool has = __builtin_cpu_supports("f16c") != 0;
+  static const bool has = [] {
+    unsigned eax = 0, ebx = 0, ecx = 0, edx = 0;
+    if (__get_cpuid(1, &eax, &ebx, &ecx, &edx) == 0) return false;
+    if ((ecx & bit_F16C) == 0 || (ecx & bit_OSXSAVE) == 0) return false;
+    unsigned low = 0, high = 0;
+    __asm__("xgetbv" : "=a"(low), "=d"(high) : "c"(0));
+    return (low & 6u) == 6u;  // the SSE and AVX register states
+  }();
   return has;
 }
 #else

@@ -8,13 +8,6 @@
 
 namespace Tarsa {
 
-namespace {
-
-// Clicks closer than this, in pixels on each axis, count as one place.
-constexpr std::int32_t kClickSlop = 3;
-
-}  // namespace
-
 CView::CView(CObjID id, CView* parent, const CRect& frame, std::uint32_t options,
              std::uint32_t binding, std::int32_t contentWidth, std::int32_t contentHeight)
     : parent_(parent), viewFlags_(ViewFlagsOf(options)), binding_(binding) {
