@@ -102,9 +102,9 @@ int CAlert::Run() {
   return cancelButton_;
 }
 
-int CAlert::Show(EKind kind, const std::string& message, const std::string& detail,
-                 const std::vector<std::string>& buttons, int defaultButton, int cancelButton,
-                 const CWindow* parent) {
+int CAlert::Ask(EKind kind, const std::string& message, const std::string& detail,
+                const std::vector<std::string>& buttons, int defaultButton, int cancelButton,
+                const CWindow* parent) {
   CAlert alert(kind, message, detail, buttons, defaultButton, cancelButton, parent);
   return alert.Run();
 }

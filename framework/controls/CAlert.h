@@ -27,9 +27,9 @@ class CAlert : public CWindow {
   bool CheckBoxChecked() const;
 
   // Makes, runs and closes an alert in one call.
-  static int Show(EKind kind, const std::string& message, const std::string& detail,
-                  const std::vector<std::string>& buttons, int defaultButton, int cancelButton,
-                  const CWindow* parent = nullptr);
+  static int Ask(EKind kind, const std::string& message, const std::string& detail,
+                 const std::vector<std::string>& buttons, int defaultButton, int cancelButton,
+                 const CWindow* parent = nullptr);
 
   // The id of button index, as the alert's buttons carry it.
   static CObjID ButtonId(int index);

@@ -7,7 +7,9 @@
 #include "framework/controls/CAlert.h"
 #include "framework/process/CKeyCodes.h"
 #include "framework/process/CMessageNames.h"
+#include "framework/process/CProcess.h"
 #include "framework/strings/CString.h"
+#include "framework/view/CWindow.h"
 
 namespace Tarsa {
 
@@ -75,7 +77,7 @@ std::string CEditNumber::RangeAlertText(double minimum, double maximum, int digi
   return text.Str();
 }
 
-bool CEditNumber::Commit() {
+bool CEditNumber::Commit(bool alertNow) {
   if (committing_) return true;
   double read = 0.0;
   const char* begin = text_.data();
@@ -91,11 +93,20 @@ bool CEditNumber::Commit() {
     return true;
   }
   Change(std::clamp(read, minimum_, maximum_));
-  committing_ = true;
-  CAlert::Show(CAlert::EKind::kCaution, RangeAlertText(minimum_, maximum_, digits_), "",
-               {"$$$/Tarsa/Alert/OK=OK"}, 0, 0, Window());
-  committing_ = false;
-  selectAll_ = true;
+  const std::string text = RangeAlertText(minimum_, maximum_, digits_);
+  const CWindow* window = Window();
+  const auto alert = [text, window] {
+    CAlert::Ask(CAlert::EKind::kCaution, text, "", {"$$$/Tarsa/Alert/OK=OK"}, 0, 0, window);
+  };
+  CProcess* process = CProcess::Current();
+  if (alertNow || process == nullptr) {
+    committing_ = true;
+    alert();
+    committing_ = false;
+    selectAll_ = true;
+  } else {
+    process->PostAction(alert);
+  }
   return false;
 }
 
@@ -133,7 +144,7 @@ void CEditNumber::OnBecameTarget() {
 
 void CEditNumber::OnLostTarget() {
   selectAll_ = false;
-  Commit();
+  Commit(false);
   CControl::OnLostTarget();
 }
 

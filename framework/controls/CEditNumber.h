@@ -33,7 +33,9 @@ class CEditNumber : public CControl {
   const std::string& Text() const { return text_; }
 
   // Reads the text; false when it had to be corrected (out of the range).
-  bool Commit();
+  // The alert that says so is shown at once, or, when the field is losing
+  // the focus, just after the focus has moved.
+  bool Commit(bool alertNow = true);
 
   void Click(CMouseMessage& message) override;
   void MouseWheel(CMouseMessage& message) override;

@@ -43,6 +43,7 @@ CWindow::~CWindow() {
 }
 
 void CWindow::Show() {
+  const bool wasOpen = open_;
   open_ = true;
   if (tipTimer_ == nullptr && CProcess::Current() != nullptr) {
     tipTimer_ = std::make_unique<TipTimer>(*this);
@@ -50,6 +51,9 @@ void CWindow::Show() {
   }
   Start();
   native_->Show(true);
+  if (CProcess* process = CProcess::Current(); process != nullptr && !wasOpen) {
+    process->EventSource().SetFocus(NativeId());
+  }
   if (Target() == nullptr || Target()->NativeWindow() != NativeId()) {
     if (!FocusNext(false)) BecomeTarget(true);
   }
@@ -259,10 +263,26 @@ void CWindow::CloseRequested() {
 CObjID CWindow::RunModal() {
   modalEnded_ = false;
   modalResult_ = CObjID();
+  // The view that had the focus gets it back afterwards, found again by its
+  // window and id, since the modal run may delete views.
+  const auto* before = dynamic_cast<const CView*>(Target());
+  const CNativeWindowId beforeWindow = before != nullptr ? before->NativeWindow() : 0;
+  const CObjID beforeId = before != nullptr ? before->GetId() : CObjID();
   Show();
   CProcess* process = CProcess::Current();
   if (process != nullptr) process->RunModal([this] { return modalEnded_; });
   Hide();
+  if (process != nullptr && beforeWindow != 0) {
+    if (auto* window = dynamic_cast<CWindow*>(process->FindWindow(beforeWindow))) {
+      CView* view = beforeId.IsNull() ? nullptr : window->FindView(beforeId);
+      if (view != nullptr && view->IsLive()) {
+        view->BecomeTarget(true);
+      } else {
+        window->BecomeTarget(true);
+      }
+      process->EventSource().SetFocus(beforeWindow);
+    }
+  }
   return modalResult_;
 }
 

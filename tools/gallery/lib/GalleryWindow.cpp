@@ -53,12 +53,13 @@ GalleryWindow::GalleryWindow(Log log)
   auto* disabled = new CPushButton(Id(kDisabled), this, CRect{270, 200, 390, 226}, "Disabled");
   disabled->SetEnabled(false);
 
-  auto* ok = new CPushButton(Id(kOk), this, CRect{440, 376, 540, 402}, "OK", kView_TabStop,
-                             kBind_FixedBottomRight);
-  ok->SetEndsModal(true);
+  // Cancel before OK: Tab goes through them in reading order.
   auto* cancel = new CPushButton(Id(kCancel), this, CRect{330, 376, 430, 402}, "Cancel",
                                  kView_TabStop, kBind_FixedBottomRight);
   cancel->SetEndsModal(true);
+  auto* ok = new CPushButton(Id(kOk), this, CRect{440, 376, 540, 402}, "OK", kView_TabStop,
+                             kBind_FixedBottomRight);
+  ok->SetEndsModal(true);
   SetDefaultView(Id(kOk));
   SetCancelView(Id(kCancel));
 }
@@ -87,10 +88,10 @@ void GalleryWindow::HandleMessage(CMessage& message) {
   log_(line);
   message.SetHandled();
   if (name == Id(kAlert)) {
-    const int pressed = CAlert::Show(CAlert::EKind::kCaution,
-                                     "Do you want to save the changes you made in the image?",
-                                     "Your changes will be lost if you don't save them.",
-                                     {"Save", "Don't Save", "Cancel"}, 0, 2, this);
+    const int pressed = CAlert::Ask(CAlert::EKind::kCaution,
+                                    "Do you want to save the changes you made in the image?",
+                                    "Your changes will be lost if you don't save them.",
+                                    {"Save", "Don't Save", "Cancel"}, 0, 2, this);
     log_(std::string("Gallery/AlertAnswer ") + std::to_string(pressed));
   }
 }

@@ -1,0 +1,45 @@
+#include "tests/framework/controls/Desktop.h"
+
+#include <spawn.h>
+#include <sys/wait.h>
+
+#include <filesystem>
+
+#include "framework/native/SdlEventSource.h"
+
+extern char** environ;
+
+namespace Tarsa::testing {
+
+Desktop::Desktop()
+    : process_(std::make_unique<CProcess>(std::make_unique<Native::SdlEventSource>())) {
+  process_->Start();
+}
+
+Desktop::~Desktop() = default;
+
+void Desktop::Pump(double seconds) { process_->DoEvents(process_->Now() + seconds); }
+
+int Desktop::Xdo(const std::vector<std::string>& arguments, double settle) {
+  std::vector<char*> argv;
+  std::string program = "xdotool";
+  argv.push_back(program.data());
+  for (const std::string& a : arguments) argv.push_back(const_cast<char*>(a.c_str()));
+  argv.push_back(nullptr);
+  pid_t pid = -1;
+  if (posix_spawnp(&pid, "xdotool", nullptr, nullptr, argv.data(), environ) != 0) return -1;
+  int status = 0;
+  // The loop runs while xdotool types and clicks, as it would under a user;
+  // nested loops (a drag, an alert) run inside it.
+  while (waitpid(pid, &status, WNOHANG) == 0) Pump(0.02);
+  Pump(settle);
+  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+std::string Desktop::Artefact(const std::string& name) {
+  const std::filesystem::path folder = std::filesystem::path(ARCHWAY_ARTEFACTS_DIR);
+  std::filesystem::create_directories(folder);
+  return (folder / name).string();
+}
+
+}  // namespace Tarsa::testing

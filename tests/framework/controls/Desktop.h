@@ -1,0 +1,33 @@
+#pragma once
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "framework/process/CProcess.h"
+
+namespace Tarsa::testing {
+
+// A process on the real display (the X server the test runs under) and the
+// means to drive it as a user would: xdotool's real input, given while the
+// process's loop runs, and screenshots saved as test artefacts.
+class Desktop {
+ public:
+  Desktop();
+  ~Desktop();
+
+  CProcess& Process() { return *process_; }
+  // Runs the loop for a while.
+  void Pump(double seconds);
+  // Runs xdotool with the arguments, the loop running meanwhile, then lets
+  // the loop settle; xdotool's exit status.
+  int Xdo(const std::vector<std::string>& arguments, double settle = 0.3);
+
+  // The path of an artefact file of the test run (the folder is made).
+  static std::string Artefact(const std::string& name);
+
+ private:
+  std::unique_ptr<CProcess> process_;
+};
+
+}  // namespace Tarsa::testing
