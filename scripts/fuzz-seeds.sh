@@ -43,6 +43,12 @@ for file in room.tif facade-cmyk.tif; do cp "$work/$file" "$corpus/tiff/synth-${
 cp "$work/room-tangential.png" "$corpus/png/synth-room-tangential.png"
 cp "$work/room-gray.jpg" "$corpus/jpeg/synth-room-gray.jpg"
 
+# The framework's PNG decoder starts from the host's PNG layouts.
+mkdir -p "$corpus/icon_png"
+for file in palette-transparent gray-alpha-interlaced rgba16-interlaced room rgb-transparent-colour; do
+  cp "$corpus/png/$file.png" "$corpus/icon_png/"
+done
+
 mkdir -p "$corpus/lens_profile"
 cp resources/profiles/*.xmp "$corpus/lens_profile/"
 
