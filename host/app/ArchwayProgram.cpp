@@ -7,6 +7,7 @@
 #include <optional>
 #include <string>
 
+#include "framework/native/NativeDisplay.h"
 #include "host/actions/ActionFile.h"
 #include "host/app/CommandLine.h"
 #include "host/app/ImageBatch.h"
@@ -182,6 +183,14 @@ int ArchwayProgram::Run(const std::vector<std::string>& arguments) {
   if (line.command == CommandLine::Command::kHelp) {
     std::fputs(kUsageText, stdout);
     return 0;
+  }
+  // The workspace is a window: without a display there is nothing to open
+  // it on, and saying so before any image is read loses nothing.
+  if (line.command == CommandLine::Command::kEdit && !Tarsa::Native::HasDisplay()) {
+    Report(
+        "edit opens the workspace in a window, and no display is set (DISPLAY); "
+        "'archway apply' corrects images without one");
+    return kFailed;
   }
 
   std::vector<ImageBatch::Job> jobs;

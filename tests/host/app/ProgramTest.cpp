@@ -39,9 +39,11 @@ std::string Quoted(const std::string& text) {
 // Runs the program with its output captured, in files outside the folder,
 // and the module's preferences in a fresh folder of their own, so that no
 // run sees another's or the user's.
-Result RunProgram(const std::vector<std::string>& arguments) {
+// environment: words put before the program, as "env -u DISPLAY".
+Result RunProgram(const std::vector<std::string>& arguments, const std::string& environment = "") {
   const ScratchFolder capture;
-  std::string command = "XDG_CONFIG_HOME=" + Quoted(capture.Dir()) + " " + Quoted(ARCHWAY_RUNNER);
+  std::string command =
+      environment + " XDG_CONFIG_HOME=" + Quoted(capture.Dir()) + " " + Quoted(ARCHWAY_RUNNER);
   for (const std::string& argument : arguments) command += " " + Quoted(argument);
   const std::string output = capture.File("stdout"), errors = capture.File("stderr");
   const int raw = std::system(
@@ -225,6 +227,22 @@ TEST_F(ProgramTest, FailuresAndCtrlCLeaveNoOutput) {
   EXPECT_EQ(result.status, 1);
   EXPECT_NE(result.errors.find("PNG cannot hold"), std::string::npos) << result.errors;
   EXPECT_FALSE(std::filesystem::exists(folder_.File("out.png")));
+}
+
+// Edit needs a window and says so before anything is read; apply needs no
+// display at all.
+TEST_F(ProgramTest, WithoutADisplayEditRefusesAndApplyWorks) {
+  const std::vector<std::string> before = WriteSamples(folder_);
+  const std::string input = folder_.File(kSamples[1].name);
+  const std::string noDisplay = "env -u DISPLAY -u WAYLAND_DISPLAY";
+  Result result = RunProgram({"edit", "--module", module_, input}, noDisplay);
+  EXPECT_NE(result.status, 0);
+  EXPECT_NE(result.errors.find("no display is set"), std::string::npos) << result.errors;
+  EXPECT_FALSE(std::filesystem::exists(folder_.File(ResultName(kSamples[1].name))));
+  EXPECT_EQ(ReadBytes(input), before[1]);
+  result = RunProgram({"apply", "--module", module_, input}, noDisplay);
+  EXPECT_EQ(result.status, 0) << result.errors;
+  EXPECT_TRUE(std::filesystem::exists(folder_.File(ResultName(kSamples[1].name))));
 }
 
 TEST_F(ProgramTest, HelpDescribesEveryOption) {
