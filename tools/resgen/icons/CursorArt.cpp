@@ -338,8 +338,11 @@ std::vector<IconArt> CursorArt() {
   const std::pair<int, double> rotations[] = {{26056, 270}, {26057, 180}, {26058, 90},
                                               {26059, 0},   {26060, 225}, {26061, 315},
                                               {26062, 135}, {26063, 45}};
-  for (const auto& [number, degrees] : rotations) {
-    art.push_back(Numbered(number, 16, 16, [degrees](cairo_t* cr) { Rotation(cr, degrees); }));
+  for (const auto& rotation : rotations) {
+    // A copy, not the pair's binding: clang 14 cannot capture a binding.
+    const double degrees = rotation.second;
+    art.push_back(
+        Numbered(rotation.first, 16, 16, [degrees](cairo_t* cr) { Rotation(cr, degrees); }));
   }
   // Over a point that can be dragged: a ring with four ways out.
   art.push_back(Numbered(26070, 16, 16, [](cairo_t* cr) {
