@@ -43,6 +43,13 @@ void CView::DeleteChild(CView* child) {
   delete child;  // unlinks itself
 }
 
+void CView::BringToFront() {
+  if (parent_ == nullptr) return;
+  std::erase(parent_->children_, this);
+  parent_->children_.push_back(this);
+  Invalidate();
+}
+
 CWindow* CView::Window() const { return parent_ != nullptr ? parent_->Window() : nullptr; }
 
 CRect CView::Frame() const {

@@ -39,6 +39,9 @@ class CView : public virtual CMessenger {
   const std::vector<CView*>& Children() const { return children_; }
   // Deletes a child and everything under it.
   void DeleteChild(CView* child);
+  // Puts the view in front of its siblings: drawn last, offered the mouse
+  // first (an open list laid over the window's other views).
+  void BringToFront();
   // The window at the root, or null for a tree not in one.
   virtual CWindow* Window() const;
 
@@ -95,6 +98,9 @@ class CView : public virtual CMessenger {
   virtual void MouseWheel(CMouseMessage& message);
   virtual void MouseEnter() {}
   virtual void MouseLeave() {}
+  // The cursor over this view: a cursor number of the icon resources, or 0
+  // for the parent's (the arrow at the root).
+  virtual std::int32_t CursorId() const { return 0; }
   // Hooks of a click, by button: the first click, and a repeated one
   // (declining, with false, sends it on as a single click).
   virtual void Click(CMouseMessage& /*message*/) {}

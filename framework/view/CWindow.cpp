@@ -3,6 +3,8 @@
 #include <cstdlib>
 #include <functional>
 
+#include "framework/icons/CIconCursor.h"
+#include "framework/native/CNativeCursor.h"
 #include "framework/process/CKeyCodes.h"
 #include "framework/process/CMessageNames.h"
 #include "framework/process/CProcess.h"
@@ -167,6 +169,29 @@ void CWindow::DeliverMouse(const CNativeEvent& event) {
     return;
   }
   DispatchMouse(message);
+  if (event.kind == ENativeKind::kMouseMove) UpdateCursor();
+}
+
+bool CWindow::CursorShowsImage() const {
+  const auto found = cursors_.find(cursorShown_);
+  return found != cursors_.end() && found->second->ShowsImage();
+}
+
+void CWindow::UpdateCursor() {
+  std::int32_t id = 0;
+  for (const CView* view = hover_; view != nullptr && id == 0; view = view->Parent()) {
+    id = view->CursorId();
+  }
+  if (id == cursorShown_) return;
+  cursorShown_ = id;
+  if (id == 0) {
+    if (arrow_ == nullptr) arrow_ = std::make_unique<CNativeCursor>(nullptr, 0, 0);
+    arrow_->Set();
+    return;
+  }
+  std::unique_ptr<CIconCursor>& cursor = cursors_[id];
+  if (cursor == nullptr) cursor = std::make_unique<CIconCursor>(id);
+  cursor->Set();
 }
 
 void CWindow::SetHover(CView* view) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <map>
 #include <memory>
 #include <string>
 
@@ -9,6 +10,9 @@
 #include "framework/view/CView.h"
 
 namespace Tarsa {
+
+class CIconCursor;
+class CNativeCursor;
 
 // The root of a view tree, shown in a native window: it paints the tree
 // into the window, turns the window's mouse events into mouse messages for
@@ -55,6 +59,11 @@ class CWindow : public CView, public CNativeWindowHandler {
   // A mouse-down on view: the click count, 1 for a first click.
   std::int32_t CountClick(const CView* view, const CMouseMessage& message);
 
+  // The cursor number shown now (0: the arrow), and whether its image could
+  // be shown (else the arrow stands in).
+  std::int32_t CursorShown() const { return cursorShown_; }
+  bool CursorShowsImage() const;
+
   // The views Return and Escape press (by id, looked up when pressed).
   void SetDefaultView(CObjID id) { defaultView_ = id; }
   void SetCancelView(CObjID id) { cancelView_ = id; }
@@ -84,6 +93,8 @@ class CWindow : public CView, public CNativeWindowHandler {
 
  private:
   void DeliverMouse(const CNativeEvent& event);
+  // Shows the cursor the view under the pointer asks for.
+  void UpdateCursor();
   // From the tip timer: shows the hovered view's tip once the pointer has
   // rested long enough.
   void ShowTipIfDue(double now);
@@ -115,6 +126,9 @@ class CWindow : public CView, public CNativeWindowHandler {
   double restingSince_ = 0.0;
   CPoint pointer_;
   bool tipShown_ = false;
+  std::int32_t cursorShown_ = -1;
+  std::map<std::int32_t, std::unique_ptr<CIconCursor>> cursors_;
+  std::unique_ptr<CNativeCursor> arrow_;
 };
 
 }  // namespace Tarsa

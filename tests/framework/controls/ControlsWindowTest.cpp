@@ -180,6 +180,22 @@ TEST_F(ControlsWindow, EscapeCancelsAnAlertAndClosingItIsCancel) {
   EXPECT_TRUE(window_->ModalEnded());
 }
 
+// A view that asks for the zoom-in cursor.
+class Magnifying : public CView {
+ public:
+  using CView::CView;
+  std::int32_t CursorId() const override { return 26008; }
+};
+
+TEST_F(ControlsWindow, ThePointerTakesTheCursorOfTheViewUnderIt) {
+  new Magnifying(CObjID(), window_.get(), CRect{20, 250, 540, 360});
+  ASSERT_EQ(At(200, 300, {}), 0);
+  EXPECT_EQ(window_->CursorShown(), 26008);
+  EXPECT_TRUE(window_->CursorShowsImage()) << "drawn from the icon resources, not the arrow";
+  ASSERT_EQ(At(300, 30, {}), 0);
+  EXPECT_EQ(window_->CursorShown(), 0);
+}
+
 TEST_F(ControlsWindow, ResizingTheWindowMovesItsViewsByTheirBindings) {
   ASSERT_EQ(desktop_->Xdo({"windowsize", "--sync", xid_, "700", "500"}), 0);
   desktop_->Pump(0.3);
