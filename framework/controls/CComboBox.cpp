@@ -7,6 +7,7 @@
 #include "framework/controls/CPopupList.h"
 #include "framework/process/CKeyCodes.h"
 #include "framework/strings/CString.h"
+#include "framework/view/CNativeWindow.h"
 #include "framework/view/CWindow.h"
 
 namespace Tarsa {
@@ -28,9 +29,13 @@ CComboBox::CComboBox(CObjID id, CView* parent, const CRect& frame, double value,
       unit_(ShownText(unit)),
       digits_(digits) {
   const CSize size = Size();
-  field_ = new CEditNumber(FieldId(), this, CRect{0, 0, size.width - kArrowWidth + 1, size.height},
+  // The unit stands after the arrow, so that the arrow meets the field.
+  if (!unit_.empty()) {
+    unitWidth_ = CreateMeasuringPort()->MeasureText(unit_, EFont::kUIMedium).width + 4;
+  }
+  field_ = new CEditNumber(FieldId(), this,
+                           CRect{0, 0, size.width - unitWidth_ - kArrowWidth + 1, size.height},
                            value, minimum, maximum, digits, kView_TabStop, kBind_XSizeable);
-  if (!unit.empty()) field_->SetUnit(unit);
 }
 
 CComboBox::~CComboBox() {
@@ -45,7 +50,8 @@ void CComboBox::SetValue(double value) { field_->SetValue(value); }
 
 CRect CComboBox::ArrowRect() const {
   const CRect image = Image();
-  return CRect{image.right - kArrowWidth, image.top, image.right, image.bottom};
+  return CRect{image.right - unitWidth_ - kArrowWidth, image.top, image.right - unitWidth_,
+               image.bottom};
 }
 
 std::string CComboBox::ChoiceText(double value) const {
@@ -99,6 +105,11 @@ void CComboBox::Draw(CPort& port) {
   const double y = arrow.top + arrow.Height() / 2.0;
   const CPointF down[] = {{x - 4, y - 2}, {x + 4, y - 2}, {x, y + 3}};
   port.FillPolygon(down, on ? Skin::kText : Skin::kTextDisabled);
+  if (!unit_.empty()) {
+    const CRect image = Image();
+    port.DrawText(unit_, CRect{arrow.right + 4, image.top, image.right, image.bottom},
+                  EFont::kUIMedium, TextColor());
+  }
 }
 
 }  // namespace Tarsa

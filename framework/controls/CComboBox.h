@@ -40,6 +40,7 @@ class CComboBox : public CControl {
   CEditNumber* field_ = nullptr;
   std::vector<double> choices_;
   std::string unit_;
+  std::int32_t unitWidth_ = 0;
   int digits_;
 };
 

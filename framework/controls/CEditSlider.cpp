@@ -55,11 +55,10 @@ void CEditSlider::HandleMessage(CMessage& message) {
   const auto* number = dynamic_cast<const CValMsg<CNumber>*>(&message);
   if (number != nullptr && (message.name == SliderId() || message.name == FieldId())) {
     message.SetHandled();
-    if (message.name == SliderId()) {
-      field_->SetValue(number->value.value);
-    } else {
-      slider_->SetValue(number->value.value);
-    }
+    // The slider's positions are the field's last digit, so a typed number
+    // is rounded to what the field shows.
+    slider_->SetValue(number->value.value);
+    field_->SetValue(slider_->Value());
     Notify(CNumber{field_->Value()}, number->change);
     return;
   }

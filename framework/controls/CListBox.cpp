@@ -22,6 +22,12 @@ class CListBox::RowArea : public CView {
     if (list_.WantsTarget() && !list_.IsTarget()) list_.BecomeTarget(false);
     list_.RowClicked(message.where.y / kRowHeight, message.clicks);
   }
+  // Whole rows, three a notch, so that the top row is never cut.
+  void MouseWheel(CMouseMessage& message) override {
+    if (Content().Height() <= Size().height) return CView::MouseWheel(message);
+    ScrollBy(0, -message.wheel * 3 * kRowHeight);
+    message.SetHandled();
+  }
   bool MultiClick(CMouseMessage& message) override {
     Click(message);
     return true;

@@ -40,6 +40,7 @@ void CPopupList::Open(CView* owner, const CRect& anchor, const std::vector<std::
   chosen_ = std::move(chosen);
   items_ = items;
   marked_ = std::clamp(marked, 0, int(items_.size()) - 1);
+  current_ = marked_;
   // Wide enough for the longest item, never narrower than the anchor.
   auto measure = CreateMeasuringPort();
   std::int32_t width = std::int32_t(anchor.Width());
@@ -189,6 +190,13 @@ void CPopupList::Draw(CPort& port) {
     const CRect row = RowRect(i);
     const bool marked = i == marked_;
     if (marked) port.FillRect(row, Skin::kAccent);
+    if (i == current_) {
+      // The item the owner shows now carries a check.
+      const std::uint32_t mark = marked ? 0xFFFFFFFF : Skin::kText;
+      const double x = row.left + 6.0, y = row.top + 5.0;
+      port.Line({x, y + 6}, {x + 3.5, y + 9.5}, mark, 1.8);
+      port.Line({x + 3.5, y + 9.5}, {x + 10, y + 2}, mark, 1.8);
+    }
     port.DrawText(items_[i], CRect{row.left + 22, row.top, row.right - 8, row.bottom},
                   EFont::kUIMedium, marked ? 0xFFFFFFFF : Skin::kText);
   }

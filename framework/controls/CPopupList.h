@@ -63,7 +63,8 @@ class CPopupList : public CView {
   Chosen chosen_;
   std::vector<std::string> items_;
   int marked_ = -1;
-  int first_ = 0;  // the first row in sight
+  int current_ = -1;  // the owner's item when the list opened
+  int first_ = 0;     // the first row in sight
   CRect box_;
 };
 
