@@ -21,6 +21,14 @@ Desktop::~Desktop() = default;
 void Desktop::Pump(double seconds) { process_->DoEvents(process_->Now() + seconds); }
 
 int Desktop::Xdo(const std::vector<std::string>& arguments, double settle) {
+  const int pid = XdoStart(arguments);
+  if (pid < 0) return -1;
+  const int status = XdoWait(pid);
+  Pump(settle);
+  return status;
+}
+
+int Desktop::XdoStart(const std::vector<std::string>& arguments) {
   std::vector<char*> argv;
   std::string program = "xdotool";
   argv.push_back(program.data());
@@ -28,11 +36,14 @@ int Desktop::Xdo(const std::vector<std::string>& arguments, double settle) {
   argv.push_back(nullptr);
   pid_t pid = -1;
   if (posix_spawnp(&pid, "xdotool", nullptr, nullptr, argv.data(), environ) != 0) return -1;
+  return pid;
+}
+
+int Desktop::XdoWait(int pid) {
   int status = 0;
   // The loop runs while xdotool types and clicks, as it would under a user;
   // nested loops (a drag, an alert) run inside it.
   while (waitpid(pid, &status, WNOHANG) == 0) Pump(0.02);
-  Pump(settle);
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 

@@ -22,6 +22,11 @@ class Desktop {
   // Runs xdotool with the arguments, the loop running meanwhile, then lets
   // the loop settle; xdotool's exit status.
   int Xdo(const std::vector<std::string>& arguments, double settle = 0.3);
+  // Starts xdotool and returns at once, for input that must arrive while
+  // the test runs a loop of its own (work under a progress dialog); the
+  // process id, or -1. XdoWait waits for it, the loop running meanwhile.
+  int XdoStart(const std::vector<std::string>& arguments);
+  int XdoWait(int pid);
 
   // The path of an artefact file of the test run (the folder is made).
   static std::string Artefact(const std::string& name);
