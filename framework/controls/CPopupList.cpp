@@ -19,7 +19,7 @@ CObjID ListId() {
 }  // namespace
 
 CPopupList::CPopupList(CWindow& window)
-    : CView(ListId(), &window, window.Image(), kView_Invisible | kView_Target) {}
+    : CView(ListId(), &window, window.Image(), kView_Invisible | kView_Target, kBind_Sizeable) {}
 
 CPopupList& CPopupList::For(CWindow& window) {
   if (auto* list = dynamic_cast<CPopupList*>(window.FindView(ListId()))) return *list;

@@ -23,8 +23,8 @@ CProgressDialog::CProgressDialog(const std::string& title, const std::string& me
     : CWindow(CObjID::Intern("Tarsa/ProgressDialog"), EWindowKind::kFloating, ShownText(title),
               CSize{400, 132}, parent) {
   message_ =
-      new CStaticText(CObjID(), this, CRect{20, 16, 380, 40}, ShownText(message), kBind_SizeTop);
-  bar_ = new CProgressBar(CObjID(), this, CRect{20, 48, 380, 64}, kBind_SizeTop);
+      new CStaticText(CObjID(), this, CRect{20, 16, 380, 40}, ShownText(message), kBind_SizeLeft);
+  bar_ = new CProgressBar(CObjID(), this, CRect{20, 48, 380, 64}, kBind_SizeLeft);
   new CPushButton(CancelId(), this, CRect{280, 90, 380, 116}, "$$$/Tarsa/Alert/Cancel=Cancel",
                   kView_TabStop, kBind_FixedBottomRight);
   SetCancelView(CancelId());

@@ -295,6 +295,32 @@ TEST_F(MoreControls, ASliderRowKeepsItsSliderAndFieldInStep) {
   EXPECT_TRUE(Logged("Gallery2/FocalLength 24.5 2"));
 }
 
+TEST_F(MoreControls, ResizingKeepsRowsAndPagesToTheirBindings) {
+  ASSERT_EQ(desktop_->Xdo({"windowsize", "--sync", xid_, "700", "500"}), 0);
+  desktop_->Pump(0.3);
+  ASSERT_EQ(window_->Size().width, 700);
+  // The tabs take the window's growth, and so do their pages; in a slider
+  // row the slider widens and the field keeps to the right end.
+  auto* tabs = Find<CTabs>(MoreControlsWindow::kTabs);
+  EXPECT_EQ(tabs->Frame(), (CRect{10, 10, 690, 444}));
+  EXPECT_EQ(tabs->Pane(0)->Frame(), (CRect{1, 27, 679, 433}));
+  EXPECT_EQ(tabs->Pane(1)->Frame(), (CRect{1, 27, 679, 433}));
+  auto* focal = Find<CEditSlider>(MoreControlsWindow::kFocal);
+  EXPECT_EQ(focal->Frame(), (CRect{10, 200, 660, 224}));
+  EXPECT_EQ(focal->Slider().Frame(), (CRect{110, 0, 552, 24}));
+  EXPECT_EQ(focal->Field().Frame(), (CRect{560, 0, 650, 24}));
+  EXPECT_EQ(window_->Find(MoreControlsWindow::kOk)->Frame(), (CRect{580, 460, 680, 486}));
+  // An open list follows the window too, and still closes on a click
+  // anywhere outside it.
+  auto* lens = Find<CRadioPopup>(MoreControlsWindow::kLens);
+  ASSERT_EQ(At(Middle(lens, lens->Image()), {"click", "1"}), 0);
+  ASSERT_NE(CPopupList::OpenIn(*window_), nullptr);
+  ASSERT_EQ(At(CPoint{680, 480}, {"click", "1"}), 0);
+  EXPECT_EQ(CPopupList::OpenIn(*window_), nullptr);
+  EXPECT_FALSE(window_->ModalEnded());
+  Screenshot("gallery2-resized.png");
+}
+
 TEST_F(MoreControls, TheProgressDialogsCancelStopsTheWorkItShows) {
   CProgressDialog dialog("Correcting", "Rendering the corrected image\u2026", window_.get());
   dialog.Update(0.0);
