@@ -54,15 +54,17 @@ function(archway_library)
 endfunction()
 
 # archway_test(NAME <name> DIRS <dir>... LIBS <our libs>... [SYSTEM ...]
-#              [END_TO_END])
+#              [END_TO_END] [WINDOWED])
 # One GoogleTest program per test folder, registered with CTest and linked
 # with the shared test support (tests/support); the
 # sanitizer variant's cases carry the prefix "san.". END_TO_END marks a
 # program that drives whole runs (the program, the acceptance scenes): it is
 # built plainly only, since the code it reaches has unit tests under the
-# sanitizers and a second, slower pass would only lengthen the run.
+# sanitizers and a second, slower pass would only lengthen the run. WINDOWED
+# marks a program that opens windows: it runs under scripts/with-display.sh
+# and saves its screenshots under the build's artefacts/.
 function(archway_test)
-  cmake_parse_arguments(A "END_TO_END" "NAME" "DIRS;LIBS;SYSTEM" ${ARGN})
+  cmake_parse_arguments(A "END_TO_END;WINDOWED" "NAME" "DIRS;LIBS;SYSTEM" ${ARGN})
   set(sources)
   foreach(dir ${A_DIRS})
     file(GLOB_RECURSE found CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/${dir}/*.cpp)
@@ -77,6 +79,13 @@ function(archway_test)
     endif()
     set(target ${A_NAME}_tests${variant})
     add_executable(${target} ${sources})
+    if(A_WINDOWED)
+      # Each run (the test listing included) under an X server of its own.
+      set_target_properties(${target} PROPERTIES CROSSCOMPILING_EMULATOR
+                            ${PROJECT_SOURCE_DIR}/scripts/with-display.sh)
+      target_compile_definitions(${target} PRIVATE
+          ARCHWAY_ARTEFACTS_DIR="${PROJECT_BINARY_DIR}/artefacts")
+    endif()
     target_compile_options(${target} PRIVATE ${ARCHWAY_WARNINGS})
     target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR})
     foreach(lib ${A_LIBS} archway_test_support)
