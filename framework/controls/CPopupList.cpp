@@ -16,6 +16,16 @@ CObjID ListId() {
   return id;
 }
 
+// Whether view lies in the tree under root, compared by address only (it
+// may be gone).
+bool InTree(const CView* root, const CView* view) {
+  if (root == view) return true;
+  for (const CView* child : root->Children()) {
+    if (InTree(child, view)) return true;
+  }
+  return false;
+}
+
 }  // namespace
 
 CPopupList::CPopupList(CWindow& window)
@@ -76,6 +86,10 @@ void CPopupList::Close(int index) {
   owner_ = nullptr;
   chosen_ = nullptr;
   SetShown(false);
+  // An owner deleted with a part of the tree could not forget its list;
+  // it is not called then.
+  CWindow* window = Window();
+  if (window == nullptr || !InTree(window, owner)) return;
   if (owner->IsLive()) owner->BecomeTarget(true);
   if (chosen) chosen(index);
 }
