@@ -2,9 +2,11 @@
 
 #include <algorithm>
 #include <cmath>
+#include <functional>
 
 #include "framework/process/CKeyCodes.h"
 #include "framework/process/CProcess.h"
+#include "framework/process/CTimer.h"
 
 namespace Tarsa {
 
@@ -117,21 +119,66 @@ void CScrollBar::DragThumb(std::int32_t grip) {
 void CScrollBar::Click(CMouseMessage& message) {
   if (!IsLive() || message.button != kButton_Left || Maximum() <= 0) return;
   const std::int32_t at = Along(message.where);
-  if (at < TrackStart() || at >= TrackEnd()) {
-    const bool back = at < TrackStart();
-    pressedPart_ = back ? 1 : 2;
-    ScrollToPosition(Position() + (back ? -lineStep_ : lineStep_));
-    TrackPress(message);
-    pressedPart_ = 0;
-    Invalidate();
-    return;
-  }
   const std::int32_t thumb = ThumbStart();
-  if (at >= thumb && at < thumb + ThumbLength()) {
+  if (at >= TrackStart() && at < TrackEnd() && at >= thumb && at < thumb + ThumbLength()) {
     DragThumb(at - thumb);
     return;
   }
-  ScrollToPosition(Position() + (at < thumb ? -Page() : Page()));
+  // An arrow steps a line and the track pages towards the pointer, once at
+  // the press and then again and again while the button is held there.
+  const bool arrow = at < TrackStart() || at >= TrackEnd();
+  const bool back = arrow ? at < TrackStart() : at < thumb;
+  pressedPart_ = arrow ? (back ? 1 : 2) : 0;
+  const auto step = [this, arrow, back](std::int32_t pointer) {
+    if (!arrow) {
+      // The track stops paging once the thumb has come under the pointer.
+      const std::int32_t start = ThumbStart();
+      if (back ? pointer >= start : pointer < start + ThumbLength()) return;
+    }
+    const std::int32_t by = arrow ? lineStep_ : Page();
+    ScrollToPosition(Position() + (back ? -by : by));
+  };
+  step(at);
+  Redraw();
+  CProcess* process = CProcess::Current();
+  if (process == nullptr || message.clicks == 0) {
+    pressedPart_ = 0;
+    return;
+  }
+
+  class Hold : public CMouseTracking, public CTimer {
+   public:
+    Hold(CScrollBar& bar, std::function<void(std::int32_t)> step, std::int32_t at)
+        : CTimer(0.05), bar_(bar), step_(std::move(step)), at_(at) {}
+    std::uint32_t Button() const override { return kButton_Left; }
+    void Track(const CNativeEvent& event) override {
+      const CPoint p = bar_.WindowToLocal({event.where.x, event.where.y});
+      inside_ = bar_.HitTest(p);
+      at_ = bar_.Along(p);
+    }
+    void OnEnd(const CNativeEvent& /*event*/) override {}
+    void Fire(double /*time*/, double elapsed) override {
+      held_ += elapsed;
+      // A pause first, so that a click steps once.
+      if (held_ < 0.35 || !inside_) return;
+      step_(at_);
+      bar_.Redraw();
+    }
+
+   private:
+    CScrollBar& bar_;
+    std::function<void(std::int32_t)> step_;
+    std::int32_t at_;
+    bool inside_ = true;
+    double held_ = 0.0;
+  };
+
+  Hold hold(*this, step, at);
+  hold.Start();
+  process->PumpWhileTracking(hold);
+  hold.Stop();
+  pressedPart_ = 0;
+  Invalidate();
 }
 
 void CScrollBar::MouseWheel(CMouseMessage& message) {

@@ -7,10 +7,10 @@ namespace Tarsa {
 // A scroll bar, vertical or horizontal, for a scrolling view: it reads the
 // view's limits and image whenever it draws, so the view's own scrolling
 // (the wheel) and the bar always agree, and moves the view with ScrollTo.
-// The arrows step a line, a press on the track pages towards the pointer,
-// and the thumb drags (the view follows as it goes). The arrow keys step and
-// Page Up and Page Down page while the bar has the focus. Each move sends
-// the view's scroll position (the image's offset from the limits' start).
+// The arrows step a line, a press on the track pages towards the pointer
+// (both repeat while the button is held), and the thumb drags (the view follows as it goes). The
+// arrow keys step and Page Up and Page Down page while the bar has the focus. Each move sends the
+// view's scroll position (the image's offset from the limits' start).
 class CScrollBar : public CControl {
  public:
   enum class EOrientation { kVertical, kHorizontal };

@@ -265,6 +265,12 @@ TEST_F(MoreControls, AScrollBarDraggedByNPixelsScrollsTheViewByTheShareOfItsTrav
   EXPECT_EQ(canvas->Image().top, before + bar->Page());
   ASSERT_EQ(At(hbar->LocalToWindow(CPoint{hbar->TrackEnd() + 7, 7}), {"click", "1"}), 0);
   EXPECT_EQ(canvas->Image().left, 12);
+  // An arrow held down goes on stepping.
+  const std::int32_t held = canvas->Image().top;
+  ASSERT_EQ(At(bar->LocalToWindow(CPoint{7, bar->TrackStart() - 7}),
+               {"mousedown", "1", "sleep", "1", "mouseup", "1"}),
+            0);
+  EXPECT_LE(canvas->Image().top, held - 5 * 12);
   Screenshot("gallery2-scrolled.png");
 }
 
