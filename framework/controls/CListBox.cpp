@@ -7,12 +7,18 @@
 
 namespace Tarsa {
 
+namespace {
+// The rows' distance from the list's edge: room for a two-pixel focus line.
+constexpr std::int32_t kInset = 2;
+}  // namespace
+
 // The scrolling view the rows lie in; the list does the drawing and the
 // choosing.
 class CListBox::RowArea : public CView {
  public:
   RowArea(CListBox& list, const CRect& frame)
-      : CView(CObjID(), &list, frame, kView_NoOptions, kBind_YScrollable | kBind_LimitTop),
+      : CView(CObjID(), &list, frame, kView_NoOptions,
+              kBind_Sizeable | kBind_YScrollable | kBind_LimitTop),
         list_(list) {}
 
   void Draw(CPort& port) override { list_.DrawRows(port, Image()); }
@@ -42,7 +48,7 @@ CListBox::CListBox(CObjID id, CView* parent, const CRect& frame,
                    std::uint32_t binding)
     : CControl(id, parent, frame, options, binding), rows_(rows) {
   const CSize size = Size();
-  rows_view_ = new RowArea(*this, CRect{1, 1, size.width - 1, size.height - 1});
+  rows_view_ = new RowArea(*this, CRect{kInset, kInset, size.width - kInset, size.height - kInset});
   bar_ = new CScrollBar(
       CObjID(), this,
       CRect{size.width - 1 - CScrollBar::kThickness, 1, size.width - 1, size.height - 1},
@@ -55,11 +61,11 @@ CListBox::CListBox(CObjID id, CView* parent, const CRect& frame,
 void CListBox::Layout() {
   const CSize size = Size();
   const std::int32_t content = Count() * kRowHeight;
-  const bool needsBar = content > size.height - 2;
+  const bool needsBar = content > size.height - 2 * kInset;
   bar_->SetShown(needsBar);
-  const std::int32_t right = size.width - 1 - (needsBar ? CScrollBar::kThickness : 0);
-  rows_view_->SetFrame(CRect{1, 1, right, size.height - 1});
-  rows_view_->SetContent(CRect{0, 0, right - 1, content});
+  const std::int32_t right = size.width - kInset - (needsBar ? CScrollBar::kThickness : 0);
+  rows_view_->SetFrame(CRect{kInset, kInset, right, size.height - kInset});
+  rows_view_->SetContent(CRect{0, 0, right - kInset, content});
 }
 
 void CListBox::SetRows(const std::vector<std::string>& rows) {
@@ -148,9 +154,12 @@ void CListBox::DrawRows(CPort& port, const CRect& shown) {
 void CListBox::Draw(CPort& port) {
   const CRect image = Image();
   port.FillRect(image, Skin::kField);
-  port.FrameRect(image, IsTarget()    ? Skin::kFocus
-                        : IsEnabled() ? Skin::kEdge
-                                      : Skin::kEdgeDisabled);
+  // The rows leave room for the focus's wider line.
+  port.FrameRect(image,
+                 IsTarget()    ? Skin::kFocus
+                 : IsEnabled() ? Skin::kEdge
+                               : Skin::kEdgeDisabled,
+                 IsTarget() ? 2.0 : 1.0);
 }
 
 }  // namespace Tarsa

@@ -139,6 +139,7 @@ TEST_F(MoreControls, ARadioGroupIsOneTabStopWhoseArrowsMoveTheChoice) {
   EXPECT_EQ(Focused(), group);
   ASSERT_EQ(Keys({"Down", "Down"}), 0);
   EXPECT_EQ(group->Chosen(), 3);
+  Screenshot("gallery2-radio-focused.png");
   ASSERT_EQ(Keys({"Down", "Up", "Up", "Up", "Up", "Up"}), 0);
   EXPECT_EQ(group->Chosen(), 0) << "the choice stops at the ends";
   // Tab leaves the group for the next control, Shift+Tab comes back to it.

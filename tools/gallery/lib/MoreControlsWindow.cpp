@@ -81,7 +81,7 @@ MoreControlsWindow::MoreControlsWindow(Log log)
     std::snprintf(name, sizeof name, "Hall %02d.tif", i);
     files.push_back(name);
   }
-  new CListBox(Id(kFiles), choices, CRect{330, 12, 520, 14 + 8 * CListBox::kRowHeight}, files, 0);
+  new CListBox(Id(kFiles), choices, CRect{330, 12, 520, 16 + 8 * CListBox::kRowHeight}, files, 0);
   new CEditSlider(Id(kFocal), choices, CRect{10, 200, 520, 224}, "Focal length:", 10.5, 5, 50, 1,
                   "mm", kBind_SizeLeft, 110, 90);
   new CEditSlider(Id(kScale), choices, CRect{10, 236, 520, 260}, "Scale:", 100, 50, 150, 0, "%",
