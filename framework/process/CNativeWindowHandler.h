@@ -26,4 +26,22 @@ class CMouseTracking {
   virtual void OnEnd(const CNativeEvent& event) = 0;
 };
 
+// A tracker as the process's pump sees it, one round at a time: the button
+// it follows, where the pointer is (OnMouse, true when that changed
+// anything), keys when it takes them, idle time, and its end.
+class CTrackerRound {
+ public:
+  virtual ~CTrackerRound() = default;
+  // 1 left, 2 middle, 3 right; 0 for a button that cannot be followed.
+  virtual std::uint32_t NativeButton() const = 0;
+  virtual CNativeWindowId TrackedWindow() const = 0;
+  virtual bool ReceivesKeys() const = 0;
+  virtual bool WantsIdle() const = 0;
+  virtual bool OnMouse(const CNativeEvent& event) = 0;
+  // A key down or up (by the event's kind) while the tracker runs.
+  virtual void OnKey(const CNativeEvent& event) = 0;
+  virtual void OnIdle(const CNativeEvent& event) = 0;
+  virtual void Stop() = 0;
+};
+
 }  // namespace Tarsa

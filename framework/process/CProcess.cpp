@@ -180,6 +180,77 @@ CNativeWindowHandler* CProcess::FindWindow(CNativeWindowId id) const {
   return found == windows_.end() ? nullptr : found->second;
 }
 
+CNativeEvent CProcess::PresentPointer(CNativeWindowId window) const {
+  CNativeEvent event;
+  event.kind = ENativeKind::kMouseMove;
+  event.window = window;
+  event.time = source_->Now();
+  event.where = source_->Pointer();
+  event.modifiers = source_->Modifiers();
+  return event;
+}
+
+bool CProcess::HandleInRound(CTrackerRound& tracker, const CNativeEvent& event) {
+  currentEvent_ = event;
+  switch (event.kind) {
+    case ENativeKind::kMouseUp:
+      if (event.code != tracker.NativeButton()) return true;
+      tracker.OnMouse(event);
+      tracker.Stop();
+      return false;
+    case ENativeKind::kMouseMove:
+      lastMouse_ = event.where;
+      if (!tracker.OnMouse(event) && tracker.WantsIdle()) tracker.OnIdle(event);
+      return true;
+    case ENativeKind::kMouseDown:
+    case ENativeKind::kMouseWheel:
+      return true;  // other buttons wait until the drag is over
+    case ENativeKind::kKeyDown:
+    case ENativeKind::kSysKeyDown:
+    case ENativeKind::kKeyUp:
+    case ENativeKind::kSysKeyUp:
+      if (tracker.ReceivesKeys()) {
+        tracker.OnKey(event);
+        return true;
+      }
+      [[fallthrough]];
+    default:
+      try {
+        if (!PreHandleKey(event)) DispatchNative(event);
+      } catch (...) {
+        CReporter::ReportCurrent();
+      }
+      return true;
+  }
+}
+
+void CProcess::TrackRound(CTrackerRound& tracker) {
+  const std::uint32_t button = tracker.NativeButton();
+  if (button == 0) {
+    tracker.Stop();
+    return;
+  }
+  CNativeEvent event;
+  if (source_->Take(event)) {
+    HandleInRound(tracker, event);
+  } else {
+    const CNativeEvent present = PresentPointer(tracker.TrackedWindow());
+    const bool held = (source_->Buttons() & (1u << (button - 1))) != 0;
+    if (!tracker.OnMouse(present) && held && tracker.WantsIdle()) tracker.OnIdle(present);
+    if (!held) {
+      tracker.Stop();
+      return;
+    }
+    CIdler::IdleOnce();
+    CTimer::FireDue(Now());
+    if (source_->Wait(std::min(Now() + 0.01, CTimer::NextDue()), event) &&
+        !HandleInRound(tracker, event)) {
+      return;
+    }
+  }
+  CTimer::FireDue(Now());
+}
+
 bool CProcess::RunModal(const std::function<bool()>& done) {
   while (!done()) {
     if (!IsRunning()) return false;

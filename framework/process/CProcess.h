@@ -59,6 +59,14 @@ class CProcess : public CExecutable, public CStringSource {
   // order, keys, paints, timers and window events go on as usual, so the
   // windows keep drawing. The mouse is captured meanwhile.
   void PumpWhileTracking(CMouseTracking& tracker);
+  // One round of a tracker's loop: the release of its button (seen in the
+  // queue, or in the button state when nothing is queued) stops it; keys,
+  // paints, timers and window events are handled in the order they came,
+  // keys going to the tracker when it takes them; the pointer's position,
+  // queued or present, goes to OnMouse, and idle time to OnIdle when that
+  // changed nothing. With nothing queued the round waits up to 10 ms, so
+  // a tracker that scrolls by itself gets rounds without any input.
+  void TrackRound(CTrackerRound& tracker);
 
   // The windows whose events the process hands on, by native id.
   void RegisterWindow(CNativeWindowId id, CNativeWindowHandler* handler);
@@ -122,6 +130,10 @@ class CProcess : public CExecutable, public CStringSource {
   static void OnIdleTimer(CTimer& timer, std::uintptr_t process);
   void Pass(std::uint32_t flags, double deadline);
   void DeliverMouseMoved(double time, std::uint32_t modifiers, CNativePoint where);
+  // The pointer now, as an event of the window.
+  CNativeEvent PresentPointer(CNativeWindowId window) const;
+  // Handles one event taken in a tracker's round; false when it ended it.
+  bool HandleInRound(CTrackerRound& tracker, const CNativeEvent& event);
 
   std::unique_ptr<CNativeEventSource> source_;
   mutable std::mutex queueLock_;

@@ -13,7 +13,9 @@
 
 namespace Tarsa {
 
+class CTracker;
 class CWindow;
+struct CMouseEvent;
 
 // A node of a window's view tree: a frame in its parent's space, an image
 // (the part of its own space the frame shows, which moves when it scrolls),
@@ -105,6 +107,21 @@ class CView : public virtual CMessenger {
   // (declining, with false, sends it on as a single click).
   virtual void Click(CMouseMessage& /*message*/) {}
   virtual bool MultiClick(CMouseMessage& /*message*/) { return false; }
+
+  // A drag the view follows itself (CViewTracker), its steps by client
+  // word: Track (false stops), keys (false stops), key releases, idle time.
+  virtual bool TrackStep(CTracker& /*tracker*/, std::int32_t /*client*/, bool /*moved*/,
+                         bool /*modifiersChanged*/) {
+    return true;
+  }
+  virtual bool TrackKey(CTracker& /*tracker*/, std::int32_t /*client*/,
+                        const CNativeEvent& /*event*/) {
+    return true;
+  }
+  virtual void TrackKeyUp(CTracker& /*tracker*/, std::int32_t /*client*/,
+                          const CNativeEvent& /*event*/) {}
+  virtual void TrackIdle(CTracker& /*tracker*/, std::int32_t /*client*/,
+                         const CMouseEvent& /*event*/) {}
 
   // Focus: whether the view can be the target, and whether Tab stops here.
   bool WantsTarget() const { return (viewFlags_ & kViewFlag_Target) != 0; }

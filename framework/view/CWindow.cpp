@@ -9,6 +9,7 @@
 #include "framework/process/CMessageNames.h"
 #include "framework/process/CProcess.h"
 #include "framework/process/CValMsg.h"
+#include "framework/tools/CTracker.h"
 
 namespace Tarsa {
 
@@ -82,6 +83,16 @@ void CWindow::PaintNow() {
   CPort& port = native_->BeginPaint(CRect{0, 0, size.width, size.height});
   port.FillRect(CRect{0, 0, size.width, size.height}, 0xFFECECEC);
   DrawTree(port);
+  if (const CTracker* tracker = CTracker::Running();
+      tracker != nullptr && tracker->View() != nullptr && tracker->View()->Window() == this) {
+    const CView& view = *tracker->View();
+    const CPoint origin = view.LocalToWindow(CPoint{0, 0});
+    port.Save();
+    port.Clip(view.LocalToWindow(view.Image()));
+    port.Translate(origin.x, origin.y);
+    tracker->DrawFeedback(port);
+    port.Restore();
+  }
   if (tipShown_) DrawTip(port);
   native_->EndPaint();
 }
