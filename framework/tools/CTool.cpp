@@ -29,46 +29,37 @@ std::int32_t CTool::DoAdjustCursor(CView& /*view*/, const CMouseEvent& /*event*/
   return kArrowCursor;
 }
 
-// Each entry asks for an override with a copy of the event; an override
-// gets the copy at the same entry, so overrides chain, and the tool itself
-// gets the original.
 void CTool::AdjustCursor(CView& view, const CMouseEvent& event) {
-  CMouseEvent copy = event;
-  CTool* other = GetOverrideTool(copy);
-  if (other != nullptr && other != this) {
-    other->AdjustCursor(view, copy);
-    cursor_ = other->cursor_;
-    return;
-  }
-  cursor_ = DoAdjustCursor(view, event);
+  cursor_ = Route(
+      event,
+      [&](CTool& other, const CMouseEvent& copy) {
+        other.AdjustCursor(view, copy);
+        return other.cursor_;
+      },
+      [&] { return DoAdjustCursor(view, event); });
 }
 
 void CTool::AdjustCursorOutside(CView& view, const CMouseEvent& event) {
-  CMouseEvent copy = event;
-  CTool* other = GetOverrideTool(copy);
-  if (other != nullptr && other != this) {
-    other->AdjustCursorOutside(view, copy);
-    cursor_ = other->cursor_;
-    return;
-  }
-  cursor_ = DoAdjustCursorOutside(view, event);
+  cursor_ = Route(
+      event,
+      [&](CTool& other, const CMouseEvent& copy) {
+        other.AdjustCursorOutside(view, copy);
+        return other.cursor_;
+      },
+      [&] { return DoAdjustCursorOutside(view, event); });
 }
 
 void CTool::MouseDown(CView& view, const CMouseEvent& event) {
-  CMouseEvent copy = event;
-  CTool* other = GetOverrideTool(copy);
-  if (other != nullptr && other != this) {
-    other->MouseDown(view, copy);
-    return;
-  }
-  DoMouseDown(view, event);
+  Route(
+      event, [&](CTool& other, const CMouseEvent& copy) { other.MouseDown(view, copy); },
+      [&] { DoMouseDown(view, event); });
 }
 
 bool CTool::MultiClick(CView& view, const CMouseEvent& event, std::int32_t count) {
-  CMouseEvent copy = event;
-  CTool* other = GetOverrideTool(copy);
-  if (other != nullptr && other != this) return other->MultiClick(view, copy, count);
-  return DoMultiClick(view, event, count);
+  return Route(
+      event,
+      [&](CTool& other, const CMouseEvent& copy) { return other.MultiClick(view, copy, count); },
+      [&] { return DoMultiClick(view, event, count); });
 }
 
 // ---- CToolGroup -------------------------------------------------------------

@@ -64,6 +64,17 @@ class CTool {
   std::int32_t Cursor() const { return cursor_; }
 
  private:
+  // Each entry asks for an override with a copy of the event; an override
+  // gets the copy at the same entry, so overrides chain, and the tool
+  // itself gets the original.
+  template <class ToOther, class ToSelf>
+  auto Route(const CMouseEvent& event, ToOther toOther, ToSelf toSelf) {
+    CMouseEvent copy = event;
+    CTool* other = GetOverrideTool(copy);
+    if (other != nullptr && other != this) return toOther(*other, copy);
+    return toSelf();
+  }
+
   CToolGroup* group_;
   CObjID id_;
   std::string name_;
