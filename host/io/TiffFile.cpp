@@ -200,7 +200,11 @@ std::unique_ptr<HostDocument> ReadThroughRgba(TIFF* tiff, const TiffLayout& layo
   char text[1024] = {};
   if (!TIFFRGBAImageOK(tiff, text)) throw HostError(path, std::string("cannot read: ") + text);
   TIFFRGBAImage image;
-  if (!TIFFRGBAImageBegin(&image, tiff, 0, text)) {
+  // Stop at the first error: otherwise libtiff passes over a strip it
+  // cannot decode, leaving its rows as they were, and a damaged file reads
+  // as sound (trying again for every chunk of rows, a small damaged file
+  // held the reader for minutes).
+  if (!TIFFRGBAImageBegin(&image, tiff, 1, text)) {
     throw HostError(path, std::string("cannot read: ") + text);
   }
   struct Ender {

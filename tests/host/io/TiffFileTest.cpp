@@ -315,6 +315,28 @@ TEST(TiffFileTest, ExpandsPalettes) {
   }
 }
 
+// Palettes and low depths are read through libtiff's RGBA interface, which
+// passes over a strip it cannot decode unless told to stop: such a file
+// was read as sound, its rows left blank.
+TEST(TiffFileTest, DamagedDataReadThroughRgbaAreRefused) {
+  ScratchFolder folder;
+  RawTiff palette(64, 64, 8, 1, PHOTOMETRIC_PALETTE);
+  palette.strip = 64;
+  palette.compression = COMPRESSION_LZW;
+  palette.colourMap.assign(3 * 256, 0);
+  for (int i = 0; i < 256; ++i) palette.colourMap[i] = static_cast<uint16_t>(i * 257);
+  std::vector<uint32_t> values(64 * 64);
+  for (size_t i = 0; i < values.size(); ++i) values[i] = (i * 37 + i / 64 * 11) % 256;
+  const std::string path = folder.File("palette.tif");
+  WriteRawTiff(path, palette, values);
+  ASSERT_NO_THROW(ImageFile::Read(path));
+  // The strip's codes, which follow the 8-byte header, garbled.
+  std::string bytes = testing::ReadBytes(path);
+  for (size_t i = 12; i < 60; ++i) bytes[i] = '\xff';
+  testing::WriteBytes(path, bytes);
+  EXPECT_THROW(ImageFile::Read(path), HostError);
+}
+
 TEST(TiffFileTest, ReadsJpegCompressedYCbCr) {
   ScratchFolder folder;
   // Flat 16 x 16 colour blocks: JPEG keeps each block's mean to a level or two.
