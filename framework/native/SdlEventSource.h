@@ -26,6 +26,10 @@ class SdlEventSource : public CNativeEventSource {
   SdlEventSource(const SdlEventSource&) = delete;
   SdlEventSource& operator=(const SdlEventSource&) = delete;
 
+  // Puts an event behind those already converted, as if the window system
+  // had sent it: for tests, and for replaying recorded input.
+  void Inject(const CNativeEvent& event) { converted_.push_back(event); }
+
   bool Peek(CNativeEvent& event) override;
   bool Take(CNativeEvent& event) override;
   bool Wait(double until, CNativeEvent& event) override;

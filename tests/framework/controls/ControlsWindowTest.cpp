@@ -10,6 +10,7 @@
 #include "framework/controls/CEditNumber.h"
 #include "framework/controls/CSlider.h"
 #include "framework/native/NativeDisplay.h"
+#include "framework/process/CKeyCodes.h"
 #include "framework/view/CWindow.h"
 #include "tests/framework/controls/Desktop.h"
 #include "tools/gallery/lib/GalleryWindow.h"
@@ -89,6 +90,38 @@ TEST_F(ControlsWindow, ClicksReachTheirControlsAndTheProgramReadsThem) {
   EXPECT_TRUE(Logged("Gallery/OK 1 2"));
   EXPECT_TRUE(window_->ModalEnded());
   Screenshot("gallery-after-clicks.png");
+}
+
+// The same road without X: events put into the framework's own event
+// source reach the controls as real input does.
+TEST_F(ControlsWindow, EventsInjectedIntoTheEventSourceReachTheControls) {
+  const CNativeWindowId id = window_->NativeId();
+  const auto at = [id](ENativeKind kind, std::int32_t x, std::int32_t y, std::uint32_t code) {
+    CNativeEvent event;
+    event.kind = kind;
+    event.window = id;
+    event.where = {x, y};
+    event.code = code;
+    return event;
+  };
+  // A click on the check box: down and up, both over it.
+  desktop_->Inject({at(ENativeKind::kMouseMove, 170, 61, 0),
+                    at(ENativeKind::kMouseDown, 170, 61, kButton_Left),
+                    at(ENativeKind::kMouseUp, 170, 61, kButton_Left)});
+  EXPECT_TRUE(Logged("Gallery/ShowMesh 1 2"));
+  // Into the line weight field: a click, then typed characters and Return.
+  desktop_->Inject({at(ENativeKind::kMouseDown, 200, 134, kButton_Left),
+                    at(ENativeKind::kMouseUp, 200, 134, kButton_Left)});
+  EXPECT_EQ(Focused(), GalleryWindow::kWeight);
+  std::vector<CNativeEvent> typing;
+  for (int i = 0; i < 6; ++i) typing.push_back(at(ENativeKind::kKeyDown, 0, 0, kKey_Backspace));
+  for (char c : std::string("12.5x")) typing.push_back(at(ENativeKind::kKeyChar, 0, 0, c));
+  typing.push_back(at(ENativeKind::kKeyDown, 0, 0, kKey_Tab));
+  desktop_->Inject(typing);
+  auto* weight = dynamic_cast<CEditNumber*>(window_->Find(GalleryWindow::kWeight));
+  ASSERT_NE(weight, nullptr);
+  EXPECT_EQ(weight->Value(), 12.5) << "the x was refused, Tab committed the rest";
+  EXPECT_TRUE(Logged("Gallery/LineWeight 12.5 2"));
 }
 
 TEST_F(ControlsWindow, ASliderDraggedByNPixelsHoldsTheValueThatCorresponds) {

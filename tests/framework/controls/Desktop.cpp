@@ -47,6 +47,15 @@ int Desktop::XdoWait(int pid) {
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
 
+void Desktop::Inject(const std::vector<CNativeEvent>& events, double settle) {
+  auto& source = static_cast<Native::SdlEventSource&>(process_->EventSource());
+  for (CNativeEvent event : events) {
+    event.time = process_->Now();
+    source.Inject(event);
+  }
+  Pump(settle);
+}
+
 std::string Desktop::Artefact(const std::string& name) {
   const std::filesystem::path folder = std::filesystem::path(ARCHWAY_ARTEFACTS_DIR);
   std::filesystem::create_directories(folder);

@@ -4,6 +4,7 @@
 #include <string>
 #include <vector>
 
+#include "framework/process/CNativeEventSource.h"
 #include "framework/process/CProcess.h"
 
 namespace Tarsa::testing {
@@ -27,6 +28,10 @@ class Desktop {
   // process id, or -1. XdoWait waits for it, the loop running meanwhile.
   int XdoStart(const std::vector<std::string>& arguments);
   int XdoWait(int pid);
+
+  // Puts events into the process's event source, as the window system
+  // would, and lets the loop handle them.
+  void Inject(const std::vector<CNativeEvent>& events, double settle = 0.2);
 
   // The path of an artefact file of the test run (the folder is made).
   static std::string Artefact(const std::string& name);
