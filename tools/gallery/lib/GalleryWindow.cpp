@@ -64,26 +64,32 @@ GalleryWindow::GalleryWindow(Log log)
   SetCancelView(Id(kCancel));
 }
 
+std::string ValueLine(const CMessage& message) {
+  const auto* value = dynamic_cast<const CValueMessage*>(&message);
+  if (value == nullptr) return {};
+  char line[160];
+  if (const auto* number = dynamic_cast<const CValMsg<CNumber>*>(&message)) {
+    std::snprintf(line, sizeof line, "%s %.6g %d", message.name.Text().c_str(), number->value.value,
+                  value->change);
+  } else if (const auto* button = dynamic_cast<const CValMsg<EButtonValue>*>(&message)) {
+    std::snprintf(line, sizeof line, "%s %d %d", message.name.Text().c_str(),
+                  static_cast<int>(button->value), value->change);
+  } else {
+    return {};
+  }
+  return line;
+}
+
 void GalleryWindow::HandleMessage(CMessage& message) {
   const CObjID name = message.name;
-  const auto* value = dynamic_cast<const CValueMessage*>(&message);
-  if (value == nullptr || FindView(name) == nullptr) {
+  const std::string line = FindView(name) != nullptr ? ValueLine(message) : std::string();
+  if (line.empty()) {
     CWindow::HandleMessage(message);
     return;
   }
-  char line[160];
-  if (const auto* number = dynamic_cast<const CValMsg<CNumber>*>(&message)) {
-    std::snprintf(line, sizeof line, "%s %.6g %d", name.Text().c_str(), number->value.value,
-                  value->change);
-    if (name == Id(kScale)) {
-      scaleText_->SetText(NumberToText(number->value.value, 1, false).Str() + " %");
-    }
-  } else if (const auto* button = dynamic_cast<const CValMsg<EButtonValue>*>(&message)) {
-    std::snprintf(line, sizeof line, "%s %d %d", name.Text().c_str(),
-                  static_cast<int>(button->value), value->change);
-  } else {
-    CWindow::HandleMessage(message);
-    return;
+  if (name == Id(kScale)) {
+    const auto& number = static_cast<const CValMsg<CNumber>&>(message);
+    scaleText_->SetText(NumberToText(number.value.value, 1, false).Str() + " %");
   }
   log_(line);
   message.SetHandled();

@@ -14,6 +14,10 @@ class CStaticText;
 
 namespace Gallery {
 
+// The log line of a control's value message, "<id> <value> <change>"; empty
+// for any other message.
+std::string ValueLine(const Tarsa::CMessage& message);
+
 // The gallery: a dialog-like window with one of every framework control,
 // laid out by hand. Every value a control sends is written to the log as a
 // line "<id> <value> <change>", so a test or a person at the terminal reads

@@ -20,6 +20,7 @@
 #include "framework/controls/CStaticText.h"
 #include "framework/controls/CTabs.h"
 #include "framework/strings/CString.h"
+#include "tools/gallery/lib/GalleryWindow.h"
 
 namespace Gallery {
 
@@ -146,19 +147,8 @@ void MoreControlsWindow::RunWork() {
 
 void MoreControlsWindow::HandleMessage(CMessage& message) {
   const CObjID name = message.name;
-  const auto* value = dynamic_cast<const CValueMessage*>(&message);
-  if (value == nullptr || FindView(name) == nullptr) {
-    CWindow::HandleMessage(message);
-    return;
-  }
-  char line[160];
-  if (const auto* number = dynamic_cast<const CValMsg<CNumber>*>(&message)) {
-    std::snprintf(line, sizeof line, "%s %.6g %d", name.Text().c_str(), number->value.value,
-                  value->change);
-  } else if (const auto* button = dynamic_cast<const CValMsg<EButtonValue>*>(&message)) {
-    std::snprintf(line, sizeof line, "%s %d %d", name.Text().c_str(),
-                  static_cast<int>(button->value), value->change);
-  } else {
+  const std::string line = FindView(name) != nullptr ? ValueLine(message) : std::string();
+  if (line.empty()) {
     CWindow::HandleMessage(message);
     return;
   }
