@@ -3,8 +3,8 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "params/PSettings.h"
 #include "framework/files/CDirectory.h"
+#include "params/PSettings.h"
 
 namespace Project {
 

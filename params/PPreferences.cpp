@@ -4,12 +4,12 @@
 #include <string>
 #include <system_error>
 
-#include "params/PreferencesDirectory.h"
 #include "framework/core/CException.h"
 #include "framework/files/CFile.h"
 #include "framework/files/CFileContainer.h"
 #include "framework/files/CMemoryContainer.h"
 #include "framework/strings/CString.h"
+#include "params/PreferencesDirectory.h"
 
 namespace Project {
 

@@ -3,11 +3,11 @@
 #include <array>
 #include <cstdint>
 
-#include "params/PSettings.h"
 #include "framework/files/CContainer.h"
 #include "framework/files/CDirectory.h"
 #include "framework/files/CStream.h"
 #include "framework/resource/FourCharCode.h"
+#include "params/PSettings.h"
 
 namespace Project {
 

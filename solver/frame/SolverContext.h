@@ -3,10 +3,10 @@
 #include <cstdint>
 #include <memory>
 
-#include "params/PSettings.h"
 #include "lens/metadata/PhotoInfo.h"
 #include "lens/sphere/Image.h"
 #include "lens/sphere/PhotoToSphere.h"
+#include "params/PSettings.h"
 
 namespace Project {
 

@@ -4,9 +4,9 @@
 #include <cmath>
 #include <vector>
 
+#include "host/actions/ActionFile.h"
 #include "params/ConstraintBlob.h"
 #include "params/Descriptor.h"
-#include "host/actions/ActionFile.h"
 #include "tools/synth/lib/SynthError.h"
 
 namespace Synth {
