@@ -109,30 +109,29 @@ void RegisterControls() {
           [](const CViewProxy& proxy) {
             return CSize{TextWidth(String(proxy.properties, "button_label")) + 28, 22};
           }));
-  CViewBuilder::Register("CStaticText",
-                         std::make_unique<CPaneBuilder<CStaticText>>(
-                             [](CView* parent, CZilGenerator& g) {
-                               return new CStaticText(g.ViewId(), parent, g.Frame(),
-                                                      String(g.Properties(), "text"), g.Binding());
-                             },
-                             [](CStaticText& text, CZilGenerator& g) {
-                               std::int32_t font = 0;
-                               if (g.Properties().GetInt("text_font", font))
-                                 text.SetFont(FontOf(font));
-                               // kTrim_Middle
-                               if (Int(g.Properties(), "text_trim", 0) == 2)
-                                 text.SetTrim(CStaticText::ETrim::kMiddle);
-                               // kAlign_Center, kAlign_Right
-                               const std::int32_t align = Int(g.Properties(), "text_align_x",
-                                                              Int(g.Properties(), "text_align", 0));
-                               if (align == 2) text.SetAlignment(EAlign::kCenter);
-                               if (align == 3) text.SetAlignment(EAlign::kEnd);
-                               bool wrap = false;
-                               if (g.Properties().GetBool("static_wrap", wrap)) text.SetWrap(wrap);
-                             },
-                             [](const CViewProxy& proxy) {
-                               return CSize{TextWidth(String(proxy.properties, "text")) + 4, 22};
-                             }));
+  CViewBuilder::Register(
+      "CStaticText",
+      std::make_unique<CPaneBuilder<CStaticText>>(
+          [](CView* parent, CZilGenerator& g) {
+            return new CStaticText(g.ViewId(), parent, g.Frame(),
+                                   ShownText(String(g.Properties(), "text")), g.Binding());
+          },
+          [](CStaticText& text, CZilGenerator& g) {
+            std::int32_t font = 0;
+            if (g.Properties().GetInt("text_font", font)) text.SetFont(FontOf(font));
+            // kTrim_Middle
+            if (Int(g.Properties(), "text_trim", 0) == 2) text.SetTrim(CStaticText::ETrim::kMiddle);
+            // kAlign_Center, kAlign_Right
+            const std::int32_t align =
+                Int(g.Properties(), "text_align_x", Int(g.Properties(), "text_align", 0));
+            if (align == 2) text.SetAlignment(EAlign::kCenter);
+            if (align == 3) text.SetAlignment(EAlign::kEnd);
+            bool wrap = false;
+            if (g.Properties().GetBool("static_wrap", wrap)) text.SetWrap(wrap);
+          },
+          [](const CViewProxy& proxy) {
+            return CSize{TextWidth(String(proxy.properties, "text")) + 4, 22};
+          }));
   CViewBuilder::Register(
       "CEditNumber",
       std::make_unique<CPaneBuilder<CEditNumber>>(
@@ -155,7 +154,7 @@ void RegisterControls() {
                          [](CView* parent, CZilGenerator& g) {
                            const CZilPropertyList& p = g.Properties();
                            auto* row = new CEditSlider(
-                               g.ViewId(), parent, g.Frame(), String(p, "button_label"),
+                               g.ViewId(), parent, g.Frame(), ShownText(String(p, "button_label")),
                                Number(p, "number_value", Number(p, "slider_value", 0)),
                                Number(p, "number_minimum", Number(p, "slider_minimum", 0)),
                                Number(p, "number_maximum", Number(p, "slider_maximum", 100)),
@@ -211,9 +210,16 @@ void RegisterPanes() {
         if (p.GetString("frame_title", title)) {
           return new CGroupBox(g.ViewId(), parent, g.Frame(), ShownText(title), g.Binding());
         }
-        // frame_none: the window's face shows through.
-        const bool bare = Int(p, "frame_style", 2) == 0;
-        return new CFramePane(g.ViewId(), parent, g.Frame(), bare ? 0u : 0xFFFFFFFFu, g.Binding());
+        // frame_none: no frame at all, only the area that holds the views.
+        if (Int(p, "frame_style", 2) == 0) {
+          return new CView(g.ViewId(), parent, g.Frame(), kView_NoOptions, g.Binding());
+        }
+        return new CFramePane(g.ViewId(), parent, g.Frame(), 0xFFFFFFFFu, g.Binding());
+      }));
+  // A plain area that only holds and places other views.
+  CViewBuilder::Register(
+      "CFrameInsert", std::make_unique<CPaneBuilder<CView>>([](CView* parent, CZilGenerator& g) {
+        return new CView(g.ViewId(), parent, g.Frame(), kView_NoOptions, g.Binding());
       }));
   CViewBuilder::Register(
       "CGroupBox", std::make_unique<CPaneBuilder<CGroupBox>>([](CView* parent, CZilGenerator& g) {
