@@ -78,6 +78,7 @@ std::unique_ptr<CViewProxy> CZilGenerator::Layout(std::string_view text) {
   const std::string copy(text.substr(0, text.find('\0')));
   views_ = 0;
   CZilLexer lexer(copy);
+  if (listener_) lexer.SetListener(listener_);
   std::vector<std::unique_ptr<CViewProxy>> roots;
   scope_ = std::make_unique<CSwiftViewScope>(nullptr, this);
   DefineZilKeywords(*scope_);

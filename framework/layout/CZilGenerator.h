@@ -7,6 +7,7 @@
 
 #include "framework/core/CRect.h"
 #include "framework/layout/CGenerator.h"
+#include "framework/layout/CZilLexer.h"
 #include "framework/layout/CZilPropertyList.h"
 #include "framework/process/CObjID.h"
 #include "framework/resource/FourCharCode.h"
@@ -62,6 +63,9 @@ class CZilGenerator : public CGenerator {
 
   // The parser counts views as it meets them (line: where, for the message).
   void CountView(int line);
+  // Told of each token the parser takes (an editor's syntax colouring);
+  // it has no effect on the result.
+  void SetListener(CZilLexer::Listener listener) { listener_ = std::move(listener); }
   // How far into the text the last parse came.
   std::size_t Furthest() const { return furthest_; }
 
@@ -77,6 +81,7 @@ class CZilGenerator : public CGenerator {
   bool bareWindow_ = false;
   int views_ = 0;
   std::size_t furthest_ = 0;
+  CZilLexer::Listener listener_;
 };
 
 }  // namespace Tarsa

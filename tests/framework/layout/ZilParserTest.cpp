@@ -2,6 +2,7 @@
 
 #include <string>
 
+#include "framework/layout/CSwiftViewScope.h"
 #include "framework/layout/CViewProxy.h"
 #include "framework/layout/CZilGenerator.h"
 #include "framework/layout/CZilSyntaxError.h"
@@ -153,6 +154,31 @@ TEST(ZilParser, SizesAreBoundedAndDeepNestingIsRefused) {
   std::string many = "W() {";
   for (int i = 0; i < CZilGenerator::kMaxViews + 1; ++i) many += "V();";
   EXPECT_THROW(Layout(many + "}"), CZilSyntaxError);
+}
+
+TEST(ZilParser, AViewScopeNeedsAGenerator) {
+  EXPECT_THROW(CSwiftViewScope scope(nullptr), std::logic_error);
+  CZilGenerator generator;
+  CSwiftViewScope root(nullptr, &generator);
+  CSwiftViewScope inner(&root);
+  EXPECT_EQ(&inner.Generator(), &generator);
+  EXPECT_TRUE(inner.AllowsLogic() && inner.AllowsSets());
+}
+
+TEST(ZilParser, TheListenerSeesEveryTokenAndChangesNothing) {
+  const std::string text = "n = 'ab';\nW(w: (n + 2) * 3) { V(); }";
+  CZilGenerator generator;
+  std::string seen;
+  std::size_t strings = 0;
+  generator.SetListener([&](EZilToken kind, std::size_t start, std::size_t end) {
+    if (kind == EZilToken::kString) ++strings;
+    seen += text.substr(start, end - start);
+  });
+  const auto root = generator.Layout(text);
+  EXPECT_EQ(seen, "n='ab';W(w:(n+2)*3){V();}");
+  EXPECT_EQ(strings, 1u);
+  EXPECT_FALSE(root->properties.Has("w"));  // n has no int: the product is undefined
+  EXPECT_EQ(generator.Furthest(), text.size());
 }
 
 }  // namespace
