@@ -24,8 +24,7 @@ void Check(const Tarsa::CViewProxy& proxy, int depth) {
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   try {
     Tarsa::CZilGenerator generator;
-    const auto root =
-        generator.Layout(std::string_view(reinterpret_cast<const char*>(data), size));
+    const auto root = generator.Layout(std::string_view(reinterpret_cast<const char*>(data), size));
     if (root == nullptr) Fuzz::Broken("a layout with no root");
     Check(*root, 0);
   } catch (const std::logic_error&) {
