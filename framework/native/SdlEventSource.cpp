@@ -91,6 +91,7 @@ SdlEventSource::SdlEventSource() {
     throw CError("$$$/Tarsa/Native/Error/NoDisplay=The display cannot be opened.");
   }
   wakeType_ = SDL_RegisterEvents(1);
+  keyState_ = SDL_GetModState();
   SDL_StartTextInput();
 }
 
@@ -131,7 +132,9 @@ void SdlEventSource::Convert(const SDL_Event& e) {
   {
     CNativeEvent n;
     n.time = Now();
-    n.modifiers = Modifiers();
+    // The keys held when this event came, not when the batch was read: SDL's
+    // own state is already that of the last event in its queue.
+    n.modifiers = ModifierBits(static_cast<SDL_Keymod>(keyState_), spaceHeld_);
     switch (e.type) {
       case SDL_QUIT:
         n.kind = ENativeKind::kQuit;
@@ -140,7 +143,8 @@ void SdlEventSource::Convert(const SDL_Event& e) {
       case SDL_KEYUP: {
         const bool down = e.type == SDL_KEYDOWN;
         if (e.key.keysym.sym == SDLK_SPACE) spaceHeld_ = down;
-        n.modifiers = ModifierBits(static_cast<SDL_Keymod>(e.key.keysym.mod), spaceHeld_);
+        keyState_ = e.key.keysym.mod;
+        n.modifiers = ModifierBits(static_cast<SDL_Keymod>(keyState_), spaceHeld_);
         n.code = KeyCode(e.key.keysym.sym);
         if (n.code == kKey_None) return;
         const bool alt = (e.key.keysym.mod & KMOD_ALT) != 0;

@@ -69,6 +69,7 @@ class SdlEventSource : public CNativeEventSource {
   CNativeTimerId nextTimer_ = 1;
   std::uint32_t wakeType_ = 0;
   bool spaceHeld_ = false;
+  std::uint32_t keyState_ = 0;  // SDL's modifier word as of the last key event read
 };
 
 }  // namespace Tarsa::Native
