@@ -10,7 +10,7 @@ namespace Tarsa {
 
 CControl::CControl(CObjID id, CView* parent, const CRect& frame, std::uint32_t options,
                    std::uint32_t binding)
-    : CView(id, parent, frame, options, binding) {}
+    : CPane(id, parent, frame, options, binding) {}
 
 std::string ShownText(std::string_view keyed) {
   const std::string text = ResolveText(keyed).Str();

@@ -6,7 +6,7 @@
 
 #include "framework/process/CNativeWindowHandler.h"
 #include "framework/process/CValMsg.h"
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
@@ -34,7 +34,7 @@ std::string ShownText(std::string_view keyed);
 // value messages a control sends up its chain when the user changes it
 // (named by the control's id, with the kind of change: set, tracking, end
 // of a drag). A dialog hears them in its HandleMessage.
-class CControl : public CView {
+class CControl : public CPane {
  public:
   CControl(CObjID id, CView* parent, const CRect& frame, std::uint32_t options = kView_TabStop,
            std::uint32_t binding = kBind_Fixed);

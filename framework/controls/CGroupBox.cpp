@@ -11,7 +11,7 @@ constexpr std::int32_t kTitleHeight = 18;
 
 CGroupBox::CGroupBox(CObjID id, CView* parent, const CRect& frame, const std::string& title,
                      std::uint32_t binding)
-    : CView(id, parent, frame, kView_NoOptions, binding), title_(ShownText(title)) {}
+    : CPane(id, parent, frame, kView_NoOptions, binding), title_(ShownText(title)) {}
 
 void CGroupBox::SetTitle(const std::string& title) {
   title_ = ShownText(title);

@@ -2,14 +2,14 @@
 
 #include <string>
 
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
 // A titled frame around related controls: a thin rounded line with the
 // title set into its top edge. The controls are its children, placed in its
 // space; Interior() says where the frame leaves room for them.
-class CGroupBox : public CView {
+class CGroupBox : public CPane {
  public:
   CGroupBox(CObjID id, CView* parent, const CRect& frame, const std::string& title = "",
             std::uint32_t binding = kBind_Fixed);

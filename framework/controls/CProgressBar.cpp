@@ -24,7 +24,7 @@ class CProgressBar::Sweep : public CTimer {
 };
 
 CProgressBar::CProgressBar(CObjID id, CView* parent, const CRect& frame, std::uint32_t binding)
-    : CView(id, parent, frame, kView_NoOptions, binding) {}
+    : CPane(id, parent, frame, kView_NoOptions, binding) {}
 
 CProgressBar::~CProgressBar() = default;
 

@@ -2,7 +2,7 @@
 
 #include <memory>
 
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
@@ -11,7 +11,7 @@ class CTimer;
 // A bar that fills from the left as work goes on, 0 to 1. Work whose end
 // cannot be told shows the indeterminate look instead: a block that sweeps
 // along the track, moved by a timer at 1/15 s while the bar is shown.
-class CProgressBar : public CView {
+class CProgressBar : public CPane {
  public:
   CProgressBar(CObjID id, CView* parent, const CRect& frame, std::uint32_t binding = kBind_Fixed);
   ~CProgressBar() override;

@@ -11,7 +11,7 @@
 namespace Tarsa {
 
 CStaticImage::CStaticImage(CObjID id, CView* parent, const CRect& frame, std::uint32_t binding)
-    : CView(id, parent, frame, kView_NoOptions, binding) {}
+    : CPane(id, parent, frame, kView_NoOptions, binding) {}
 
 void CStaticImage::SetPixels(const std::uint8_t* rgba, std::int32_t width, std::int32_t height,
                              std::int32_t rowBytes) {

@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
@@ -12,7 +12,7 @@ namespace Tarsa {
 // found by name (and state) among the module's icons. It is drawn at its
 // own size, centred, or shrunk to fit the view, keeping its proportions.
 // An icon that cannot be found draws nothing.
-class CStaticImage : public CView {
+class CStaticImage : public CPane {
  public:
   CStaticImage(CObjID id, CView* parent, const CRect& frame, std::uint32_t binding = kBind_Fixed);
 

@@ -6,7 +6,7 @@ namespace Tarsa {
 
 CStaticText::CStaticText(CObjID id, CView* parent, const CRect& frame, const std::string& text,
                          std::uint32_t binding)
-    : CView(id, parent, frame, kView_NoOptions, binding), text_(text) {}
+    : CPane(id, parent, frame, kView_NoOptions, binding), text_(text) {}
 
 void CStaticText::SetText(const std::string& text) {
   if (text == text_) return;

@@ -2,14 +2,14 @@
 
 #include <string>
 
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
 // A line (or, wrapping, a paragraph) of text that the user reads but does
 // not change. A line too long for the view is trimmed at its end, or in its
 // middle for a view that asks so (a camera name keeps its model number).
-class CStaticText : public CView {
+class CStaticText : public CPane {
  public:
   enum class ETrim { kEnd, kMiddle };
 

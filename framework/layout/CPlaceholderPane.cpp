@@ -4,7 +4,7 @@ namespace Tarsa {
 
 CPlaceholderPane::CPlaceholderPane(CObjID id, CView* parent, const CRect& frame,
                                    std::string className, std::uint32_t binding)
-    : CView(id, parent, frame, kView_NoOptions, binding), className_(std::move(className)) {}
+    : CPane(id, parent, frame, kView_NoOptions, binding), className_(std::move(className)) {}
 
 void CPlaceholderPane::Draw(CPort& port) {
   const CRect box = Image();

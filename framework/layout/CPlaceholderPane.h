@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "framework/view/CView.h"
+#include "framework/view/CPane.h"
 
 namespace Tarsa {
 
@@ -10,7 +10,7 @@ namespace Tarsa {
 // builder yet (a pane the workspace will add): it takes the place and the
 // id the file gives, holds the children, and draws a light frame with the
 // class's name, so a window built early shows where the pane will go.
-class CPlaceholderPane : public CView {
+class CPlaceholderPane : public CPane {
  public:
   CPlaceholderPane(CObjID id, CView* parent, const CRect& frame, std::string className,
                    std::uint32_t binding = kBind_Fixed);
