@@ -8,7 +8,7 @@ packages=(
   clang-format g++-multilib
   libtiff-dev libpng-dev libjpeg-dev
   libegl-dev libgl-dev libglu1-mesa-dev libegl-mesa0 libgl1-mesa-dri
-  libsdl2-dev libcairo2-dev libpango1.0-dev fonts-dejavu-core xvfb xauth xdotool
+  libsdl2-dev libx11-dev libcairo2-dev libpango1.0-dev fonts-dejavu-core xvfb xauth xdotool
   libexiv2-dev
   libexempi-dev
   libsuitesparse-dev libopenblas-dev libtbb-dev

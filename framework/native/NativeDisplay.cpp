@@ -3,12 +3,19 @@
 #include <cstdlib>
 
 #include <SDL.h>
+#include <X11/Xlib.h>
 
 namespace Tarsa::Native {
 
 namespace {
 
 bool gVideoStarted = false;
+
+// Requests the window layer makes about a window the server has just seen
+// destroyed (a raise or focus racing an alert's close) come back as errors,
+// and Xlib's own handler ends the process for them: the user's work would
+// go with it. They are dropped instead; the request had nothing left to do.
+int IgnoreXError(Display* /*display*/, XErrorEvent* /*error*/) { return 0; }
 
 bool NonEmptyEnv(const char* name) {
   const char* value = std::getenv(name);
@@ -26,6 +33,7 @@ bool StartWindowSystem() {
   // user of a dialog expects.
   SDL_SetHint(SDL_HINT_MOUSE_FOCUS_CLICKTHROUGH, "1");
   if (SDL_InitSubSystem(SDL_INIT_VIDEO) != 0) return false;
+  if (std::getenv("DISPLAY") != nullptr) XSetErrorHandler(IgnoreXError);
   gVideoStarted = true;
   return true;
 }

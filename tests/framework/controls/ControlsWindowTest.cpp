@@ -13,6 +13,7 @@
 #include "framework/process/CKeyCodes.h"
 #include "framework/view/CWindow.h"
 #include "tests/framework/controls/Desktop.h"
+#include "tests/framework/controls/GalleryFixture.h"
 #include "tools/gallery/lib/GalleryWindow.h"
 
 namespace Tarsa::testing {
@@ -21,54 +22,12 @@ namespace {
 using Gallery::GalleryWindow;
 
 // The gallery on the display, driven with real X input through xdotool.
-class ControlsWindow : public ::testing::Test {
+class ControlsWindow : public GalleryFixture<GalleryWindow> {
  protected:
-  void SetUp() override {
-    if (!Native::HasDisplay()) GTEST_SKIP() << "no display; these tests run under xvfb-run";
-    desktop_ = std::make_unique<Desktop>();
-    window_ =
-        std::make_unique<GalleryWindow>([this](const std::string& line) { log_.push_back(line); });
-    window_->Show();
-    desktop_->Pump(0.3);
-    xid_ = std::to_string(window_->Native().SystemHandle());
-    ASSERT_NE(xid_, "0");
-  }
-
-  void TearDown() override {
-    window_.reset();
-    desktop_.reset();
-  }
-
-  // Real input: the pointer moved to a point of the window, then the rest.
-  int At(std::int32_t x, std::int32_t y, std::vector<std::string> then) {
-    // No --sync: it waits for a move, and never sees one to where the
-    // pointer already is; the server keeps the move and the rest in order.
-    std::vector<std::string> arguments = {"mousemove", "--window", xid_, std::to_string(x),
-                                          std::to_string(y)};
-    arguments.insert(arguments.end(), then.begin(), then.end());
-    return desktop_->Xdo(arguments);
-  }
-  int Keys(std::vector<std::string> keys) {
-    std::vector<std::string> arguments = {"key", "--delay", "40"};
-    arguments.insert(arguments.end(), keys.begin(), keys.end());
-    return desktop_->Xdo(arguments);
-  }
-  bool Logged(const std::string& line) const {
-    return std::find(log_.begin(), log_.end(), line) != log_.end();
-  }
   std::string Focused() const {
     const auto* view = dynamic_cast<const CView*>(CMessenger::Target());
     return view != nullptr && !view->GetId().IsNull() ? view->GetId().Text() : "";
   }
-  void Screenshot(const std::string& name) {
-    window_->PaintNow();
-    EXPECT_TRUE(window_->SaveImage(Desktop::Artefact(name)));
-  }
-
-  std::unique_ptr<Desktop> desktop_;
-  std::unique_ptr<GalleryWindow> window_;
-  std::vector<std::string> log_;
-  std::string xid_;
 };
 
 TEST_F(ControlsWindow, ClicksReachTheirControlsAndTheProgramReadsThem) {

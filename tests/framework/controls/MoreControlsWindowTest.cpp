@@ -23,6 +23,7 @@
 #include "framework/core/CException.h"
 #include "framework/native/NativeDisplay.h"
 #include "tests/framework/controls/Desktop.h"
+#include "tests/framework/controls/GalleryFixture.h"
 #include "tools/gallery/lib/MoreControlsWindow.h"
 
 namespace Tarsa::testing {
@@ -31,24 +32,8 @@ namespace {
 using Gallery::MoreControlsWindow;
 
 // The gallery's second window on the display, driven with real X input.
-class MoreControls : public ::testing::Test {
+class MoreControls : public GalleryFixture<MoreControlsWindow> {
  protected:
-  void SetUp() override {
-    if (!Native::HasDisplay()) GTEST_SKIP() << "no display; these tests run under xvfb-run";
-    desktop_ = std::make_unique<Desktop>();
-    window_ = std::make_unique<MoreControlsWindow>(
-        [this](const std::string& line) { log_.push_back(line); });
-    window_->Show();
-    desktop_->Pump(0.3);
-    xid_ = std::to_string(window_->Native().SystemHandle());
-    ASSERT_NE(xid_, "0");
-  }
-
-  void TearDown() override {
-    window_.reset();
-    desktop_.reset();
-  }
-
   template <class T>
   T* Find(const char* id) {
     return dynamic_cast<T*>(window_->Find(id));
@@ -59,36 +44,15 @@ class MoreControls : public ::testing::Test {
                                       local.top + std::int32_t(local.Height()) / 2});
   }
   // Real input: the pointer moved to a window point, then the rest.
-  int At(CPoint p, std::vector<std::string> then) {
-    std::vector<std::string> arguments = {"mousemove", "--window", xid_, std::to_string(p.x),
-                                          std::to_string(p.y)};
-    arguments.insert(arguments.end(), then.begin(), then.end());
-    return desktop_->Xdo(arguments);
-  }
-  int Keys(std::vector<std::string> keys) {
-    std::vector<std::string> arguments = {"key", "--delay", "40"};
-    arguments.insert(arguments.end(), keys.begin(), keys.end());
-    return desktop_->Xdo(arguments);
-  }
-  bool Logged(const std::string& line) const {
-    return std::find(log_.begin(), log_.end(), line) != log_.end();
-  }
+  using GalleryFixture<MoreControlsWindow>::At;
+  int At(CPoint p, std::vector<std::string> then) { return At(p.x, p.y, std::move(then)); }
   const CView* Focused() const { return dynamic_cast<const CView*>(CMessenger::Target()); }
-  void Screenshot(const std::string& name) {
-    window_->PaintNow();
-    EXPECT_TRUE(window_->SaveImage(Desktop::Artefact(name)));
-  }
   void ShowPage(int page) {
     auto* tabs = Find<CTabs>(MoreControlsWindow::kTabs);
     ASSERT_NE(tabs, nullptr);
     ASSERT_EQ(At(Middle(tabs, tabs->TabRect(page)), {"click", "1"}), 0);
     ASSERT_EQ(tabs->Chosen(), page);
   }
-
-  std::unique_ptr<Desktop> desktop_;
-  std::unique_ptr<MoreControlsWindow> window_;
-  std::vector<std::string> log_;
-  std::string xid_;
 };
 
 TEST_F(MoreControls, ARadioPopupChoosesByMouseAndByKeyboardAndEscapeChangesNothing) {
