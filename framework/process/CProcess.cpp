@@ -260,64 +260,48 @@ bool CProcess::RunModal(const std::function<bool()>& done) {
 }
 
 void CProcess::PumpWhileTracking(CMouseTracking& tracker) {
-  const std::uint32_t button = tracker.Button();
-  const std::uint32_t bit = 1u << (button - 1);
+  // The drag runs on a tracker's rounds: each new position goes to Track,
+  // and the last one, the release's, to OnEnd.
+  class Drag : public CTrackerRound {
+   public:
+    explicit Drag(CMouseTracking& tracking) : tracking_(tracking) {}
+    std::uint32_t NativeButton() const override { return tracking_.Button(); }
+    CNativeWindowId TrackedWindow() const override { return last_.window; }
+    bool ReceivesKeys() const override { return false; }
+    bool WantsIdle() const override { return false; }
+    bool OnMouse(const CNativeEvent& event) override {
+      const bool moved = !seen_ || !(event.where == last_.where);
+      const CNativeWindowId window = last_.window;
+      last_ = event;
+      if (event.window == 0) last_.window = window;
+      seen_ = true;
+      if (moved) tracking_.Track(last_);
+      return moved;
+    }
+    void OnKey(const CNativeEvent& /*event*/) override {}
+    void OnIdle(const CNativeEvent& /*event*/) override {}
+    void Stop() override { running_ = false; }
+    bool Running() const { return running_; }
+    const CNativeEvent& Last() const { return last_; }
+
+   private:
+    CMouseTracking& tracking_;
+    CNativeEvent last_;
+    bool seen_ = false;
+    bool running_ = true;
+  } drag(tracker);
+
   source_->CaptureMouse(true);
-  // Ends the drag whatever a handler does, so the capture never outlives it.
+  // The capture never outlives the drag, whatever a handler does.
   struct Release {
     CNativeEventSource& source;
     ~Release() { source.CaptureMouse(false); }
   } release{*source_};
-  CNativeWindowId window = 0;
-  for (;;) {
-    CNativeEvent event;
-    bool got = source_->Take(event);
-    if (!got) {
-      // Nothing queued: a release the queue never showed is read from the
-      // button state, so a drag cannot hang.
-      if ((source_->Buttons() & bit) == 0) {
-        CNativeEvent end;
-        end.kind = ENativeKind::kMouseUp;
-        end.window = window;
-        end.time = Now();
-        end.where = source_->Pointer();
-        end.code = button;
-        tracker.OnEnd(end);
-        return;
-      }
-      got = source_->Wait(std::min(Now() + 0.05, CTimer::NextDue()), event);
-      if (!got) {
-        CTimer::FireDue(Now());
-        continue;
-      }
-    }
-    currentEvent_ = event;
-    switch (event.kind) {
-      case ENativeKind::kMouseMove:
-        window = event.window;
-        lastMouse_ = event.where;
-        tracker.Track(event);
-        break;
-      case ENativeKind::kMouseUp:
-        if (event.code == button) {
-          tracker.Track(event);
-          tracker.OnEnd(event);
-          return;
-        }
-        break;
-      case ENativeKind::kMouseDown:
-      case ENativeKind::kMouseWheel:
-        break;  // other buttons wait until the drag is over
-      default:
-        try {
-          if (!PreHandleKey(event)) DispatchNative(event);
-        } catch (...) {
-          CReporter::ReportCurrent();
-        }
-        break;
-    }
-    CTimer::FireDue(Now());
-  }
+  while (drag.Running()) TrackRound(drag);
+  CNativeEvent end = drag.Last();
+  end.kind = ENativeKind::kMouseUp;
+  end.code = tracker.Button();
+  tracker.OnEnd(end);
 }
 
 // ---- Deferred events --------------------------------------------------------
