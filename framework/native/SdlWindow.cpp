@@ -149,7 +149,6 @@ void SdlWindow::Invalidate(const CRect& /*rect*/) {
 CPort& SdlWindow::BeginPaint(const CRect& area) {
   exposePosted_ = false;
   FitSurface();
-  paintArea_ = area;
   paintContext_ = cairo_create(surface_);
   port_ = std::make_unique<CairoPort>(paintContext_);
   port_->Clip(area);

@@ -51,7 +51,6 @@ class SdlWindow : public CNativeWindow {
   cairo_surface_t* surface_ = nullptr;
   cairo_t* paintContext_ = nullptr;
   std::unique_ptr<CairoPort> port_;
-  CRect paintArea_;
   bool exposePosted_ = false;
 };
 
