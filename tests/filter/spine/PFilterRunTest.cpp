@@ -6,7 +6,7 @@
 
 #include <gtest/gtest.h>
 
-#include "filter/EntryFI.h"
+#include "workspace/EntryFI.h"
 #include "filter/PFilter.h"
 #include "framework/native/NativeDisplay.h"
 #include "framework/plugin/CFrameworkServices.h"

@@ -1,4 +1,4 @@
-#include "filter/EntryFI.h"
+#include "workspace/EntryFI.h"
 
 #include "filter/PFilter.h"
 #include "framework/plugin/CPluginEntry.h"
