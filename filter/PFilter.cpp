@@ -204,7 +204,10 @@ bool PFilter::DoStart() {
       PrepareSolver();
       if (IsInteractive()) {
         LoadBehaviorFile();
-        if (RunDialog()) WriteDescriptor(settings);
+        if (RunDialog()) {
+          rendered_ = 1;
+          WriteDescriptor(settings);
+        }
       } else {
         Solve();
         if (hub.RenderFinalSilent()) {
@@ -218,7 +221,10 @@ bool PFilter::DoStart() {
       settings.focalLength = FocalFromMetadata(true);
       LoadBehaviorFile();
       PrepareSolver();
-      if (RunDialog()) WriteDescriptor(settings);
+      if (RunDialog()) {
+        rendered_ = 1;
+        WriteDescriptor(settings);
+      }
     } else {
       settings = local;
       ReadDescriptor(settings);  // a descriptor that cannot be read leaves the defaults
@@ -300,6 +306,11 @@ void PFilter::PrepareSolver() {
 }
 
 void PFilter::Solve() { Constraints().GetSolver().Solve(true, false); }
+
+void PFilter::SolveAfresh() {
+  PrepareSolver();
+  Solve();
+}
 
 bool PFilter::RunDialog() { throw Tarsa::CError(kDialogMissingText); }
 

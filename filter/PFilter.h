@@ -125,14 +125,22 @@ class PFilter : public Tarsa::CQuillmarkFilter,
   virtual bool MatchLensProfile(bool warn);
   // The fragment shader's file; empty: the one beside the host executable.
   virtual std::string ShaderFile() const { return {}; }
+  // The interactive run: the workspace, open until the user closes it; true
+  // when it closed with OK after the final image went to the host. The
+  // filter alone has no workspace and refuses.
+  virtual bool RunDialog();
+  // Builds the grid and solves it as a scripted run does, from the settings
+  // alone: the dialog's OK ends with this, so that what it writes is what a
+  // replay of the stored action writes.
+  void SolveAfresh();
+  // One solve of the grid as it stands, with its constraints.
+  void Solve();
 
  private:
   void OpenMetadata();
   void CloseMetadata();
   void EndRun();
   void PrepareSolver();
-  void Solve();
-  bool RunDialog();
   float KnownPhysicalFocal();
   std::int64_t LargerSide() const;
 
@@ -155,12 +163,13 @@ class PFilter : public Tarsa::CQuillmarkFilter,
     return ChooseSphereModel(image, model);
   }
   void ReportSolve(bool failed) override { solveFailed_ = failed ? 1 : 0; }
-  // A new mesh makes every rendered result stale; until panes exist there is
-  // nothing to redraw.
+  // A new mesh makes every rendered result stale.
   void RebuildResults() override {
     if (imageHub_ != nullptr) imageHub_->RebuildResults();
   }
-  void RedrawResults() override {}
+  void RedrawResults() override {
+    if (imageHub_ != nullptr && imageHub_->HasPreview()) imageHub_->RebuildResults();
+  }
 
   // The render stages' view of the run.
   Tarsa::CQuillmarkFilter& RenderHost() override { return *this; }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -10,6 +11,8 @@
 namespace Project {
 
 class POpenGLManager;
+class PPreview;
+class PPreviewTarget;
 class PRenderContext;
 class PResult;
 class PResultScaled;
@@ -64,9 +67,29 @@ class PImageHub : public Tarsa::CIdler {
   // display rectangle must have been set.
   PSourceScaled& SourceScaled();
   PResultScaled& ResultScaled();
+  // The result drawn straight at the display's size from the reduced source.
+  PResult& ResultDirect();
+  // What the preview pane shows; made by ConnectPane.
+  PPreview& Preview();
+  bool HasPreview() const { return preview_ != nullptr; }
 
-  // The area on screen; empty until a preview shows. The scaled stages map
-  // it onto the source's rectangle.
+  // The pane that shows the preview, or null to let go of it (which clears
+  // the display area). The pane outlives its connection.
+  void ConnectPane(PPreviewTarget* pane);
+  // The part of the display picture the pane shows: the idle work makes
+  // those tiles first and the others not at all.
+  void SetVisibleRect(const Tarsa::CRect& rect);
+  // The counts are stale: the next idle pass counts again.
+  void RequestRecount();
+  // The display's steps, done and in all, as of the last count.
+  std::uint64_t DisplayDone() const { return displayDone_; }
+  std::uint64_t DisplayTotal() const { return displayTotal_; }
+  // Runs idle steps until the visible preview is complete or the budget
+  // (seconds) is spent; true when it is complete.
+  bool RunSteps(double budget);
+
+  // The display picture's rectangle; empty until a preview shows. The
+  // scaled stages map it onto the source's rectangle.
   void SetDisplayRect(const Tarsa::CRect& rect);
   const Tarsa::CRect& DisplayRect() const { return displayRect_; }
 
@@ -74,20 +97,25 @@ class PImageHub : public Tarsa::CIdler {
   void RebuildResults();
   // The source changed over area: the stages built on it are stale there.
   void SourceChanged(const Tarsa::CRect& area);
-  // The full result changed over area: its reduction is stale there.
-  void ResultChanged(const Tarsa::CRect& area);
+  // A result changed over area (in its coordinates): what shows it is stale
+  // there.
+  void ResultChanged(const PResult& result, const Tarsa::CRect& area);
 
   // Idle work runs only while no one holds the hub suspended.
   void Suspend();
   void Resume();
   bool Suspended() const { return suspendCount_ != 0; }
 
-  // Reads ahead the source, a tile per call, while nothing else is due.
+  // Makes the visible preview, then reads ahead the source, for at most a
+  // quarter of a second a call.
   bool Idle() override;
 
   // The final image into the host, with the host's progress and abort
   // callbacks; true when every tile went back, false on the host's abort.
   bool RenderFinalSilent();
+  // The same from the dialog's OK, with a progress window shown once the
+  // work has taken delay seconds; false when the user cancelled.
+  bool RenderFinalWithDialog(double delay, const std::string& title, const std::string& message);
 
  private:
   PRenderContext& run_;
@@ -101,11 +129,26 @@ class PImageHub : public Tarsa::CIdler {
   bool glUsable_ = false;
   bool npotTextures_ = false;
   std::uint32_t suspendCount_ = 0;
+  // One step of the display's work, or of the source's read-ahead; the
+  // steps run.
+  std::uint32_t StepOnce();
+  // The final rendering's loop; report takes done and total after each
+  // slice and answers whether to go on.
+  bool RenderFinal(const std::function<bool(std::uint64_t, std::uint64_t)>& report);
+  void Recount();
+
   Tarsa::CRect displayRect_;
+  Tarsa::CRect visibleRect_;
+  PPreviewTarget* pane_ = nullptr;
+  bool needsRecount_ = true;
+  std::uint64_t displayDone_ = 0;
+  std::uint64_t displayTotal_ = 0;
   std::unique_ptr<PSource> sourceFull_;
   std::unique_ptr<PSourceScaled> sourceScaled_;
   std::unique_ptr<PResult> resultFull_;
+  std::unique_ptr<PResult> resultDirect_;
   std::unique_ptr<PResultScaled> resultScaled_;
+  std::unique_ptr<PPreview> preview_;
 };
 
 }  // namespace Project

@@ -27,9 +27,13 @@ constexpr std::size_t kBandBytes = 64 * 1024;
 
 }  // namespace
 
-PResult::PResult(PImageHub& hub, PRenderContext& run)
+PResult::PResult(PImageHub& hub, PRenderContext& run, Tarsa::CPixProcess& source,
+                 std::function<Tarsa::CVirtualPixmap*()> sourcePixels, bool sourceHasAlpha)
     : hub_(hub),
       run_(run),
+      source_(source),
+      sourcePixels_(std::move(sourcePixels)),
+      sourceHasAlpha_(sourceHasAlpha),
       depth_(run.RenderHost().Depth()),
       planes_(run.RenderHost().ColorPlanes() + 1),
       blocks_(planes_, depth_) {}
@@ -83,11 +87,12 @@ void PResult::SetRect(const Tarsa::CRect& rect) {
   resultHeight_ = std::int32_t(rect.Height());
   Layout(rect, TileRect({rect.left, rect.top}, 0, 0));
   SetStepsPerCell(1);
-  const Tarsa::CRect source = hub_.SourceRect();
+  // The source stage covers the same rectangle as the result: the whole
+  // image at full size, or the display area from the reduced source.
   geometry_.Build(Mesh(), {resultWidth_,
                            resultHeight_,
                            run_.RenderSolver().FitBox(0),
-                           {source.left, source.top},
+                           {rect.left, rect.top},
                            hub_.NpotTextures()});
 }
 
@@ -100,7 +105,7 @@ void PResult::Invalidate(const Tarsa::CRect& area) {
   ahead_.valid = false;
   inflight_.valid = false;
   blocks_.Drop();
-  hub_.ResultChanged(stale);
+  hub_.ResultChanged(*this, stale);
 }
 
 void PResult::InvalidateAll() {
@@ -133,7 +138,7 @@ int PResult::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCoun
     ++stepCount;
     return 1;
   }
-  PSource& source = hub_.Source();
+  Tarsa::CPixProcess& source = source_;
   if (col != currentCol_ || row != currentRow_) {
     currentSourceRect_ = {};
     currentHasCells_ = PrepareTile(col, row, currentSourceRect_);
@@ -150,12 +155,12 @@ int PResult::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCoun
   if (!hub_.GLUsable()) {
     // No warp without OpenGL: the result is the source.
     if (!BringUpToDate(source, tile, wait, stepCount)) return 1;
-    dest.CopyFrom(*source.Pixels(), tile);
+    dest.CopyFrom(*sourcePixels_(), tile);
   } else if (currentHasCells_) {
     if (!currentSourceRect_.IsEmpty() &&
         !BringUpToDate(source, currentSourceRect_, wait, stepCount))
       return 1;
-    const Tarsa::CPixmap* from = source.Pixels();
+    const Tarsa::CPixmap* from = sourcePixels_();
     std::unique_ptr<Tarsa::CMemoryPixmap> cut;
     if (run_.RenderSettings().projectionModel == PSettings::kModelFullSpherical) {
       // Near the poles and across the seam the equirectangular picture is
@@ -223,7 +228,7 @@ void PResult::FillPicture(const Tarsa::CPixmap& source, const Placement& place,
                           std::vector<Tarsa::CRect>* late) {
   const POpenGLTilePass format = TexelFormat(place.textureWidth, place.textureHeight);
   const std::size_t texelBytes = depth_ == 16 ? 8 : 4;
-  PSource& stage = hub_.Source();
+  Tarsa::CPixProcess& stage = source_;
   for (const Tarsa::CRect& part : parts) {
     std::int32_t firstCol = 0, firstRow = 0;
     std::uint32_t columns = 0, rows = 0;
@@ -273,7 +278,7 @@ void PResult::FillAhead(const Tarsa::CPixmap& source, std::int32_t col, std::int
   ahead_.row = nextRow;
   ahead_.texture = TextureOfSize(next.textureWidth, next.textureHeight, drawing);
   ahead_.late.clear();
-  if (stepCount != nullptr && !BringUpToDate(hub_.Source(), next.source, true, *stepCount)) return;
+  if (stepCount != nullptr && !BringUpToDate(source_, next.source, true, *stepCount)) return;
   FillMargins(next, ahead_.texture);
   FillPicture(source, next, ahead_.texture, {next.source}, &ahead_.late);
   ahead_.valid = true;
@@ -348,7 +353,7 @@ void PResult::SetCover(POpenGLTilePass& pass, std::uint32_t passIndex) const {
   // With transparency the edge fades the alpha, the last plane, which
   // rides in the last pass's A; without, every channel fades to the black
   // of the outside.
-  const bool fadeAll = !hub_.Source().HasAlpha();
+  const bool fadeAll = !sourceHasAlpha_;
   const bool lastPass = passIndex + 1 == (planes_ < 5 ? 1u : 2u);
   for (int c = 0; c < 4; ++c) pass.coverScale[c] = fadeAll || (lastPass && c == 3) ? 1.0f : 0.0f;
 }
@@ -365,7 +370,7 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   const bool textured = pass.drawGeometry && pass.textured;
   // With one pass and the stage's own source, textures come from the kept
   // source tiles, and the next tile's is filled while this one draws.
-  const bool fromBlocks = textured && passes == 1 && &source == hub_.Source().Pixels();
+  const bool fromBlocks = textured && passes == 1 && &source == sourcePixels_();
   const bool drawn = inflight_.valid && inflight_.col == col && inflight_.row == row &&
                      inflight_.placement == place && inflight_.draw == gl.DrawCount() && fromBlocks;
   inflight_.valid = false;
@@ -422,8 +427,8 @@ void PResult::DrawAhead(std::int32_t col, std::int32_t row, std::uint32_t& stepC
   std::int32_t nextCol = 0, nextRow = 0;
   if (!NextTile(col, row, nextCol, nextRow) || ahead_.col != nextCol || ahead_.row != nextRow)
     return;
-  PSource& source = hub_.Source();
-  const Tarsa::CPixmap* pixels = source.Pixels();
+  Tarsa::CPixProcess& source = source_;
+  const Tarsa::CPixmap* pixels = sourcePixels_();
   if (pixels == nullptr || !blocks_.Holds(pixels, halfTexels_)) return;
   if (!BringUpToDate(source, ahead_.placement.source, true, stepCount)) return;
 

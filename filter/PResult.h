@@ -3,6 +3,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <vector>
 
@@ -38,7 +39,11 @@ class PResult : public Tarsa::CPixProcess {
  public:
   using CellSet = PTileGeometry::CellSet;
 
-  PResult(PImageHub& hub, PRenderContext& run);
+  // source: the stage the pixels come from, the full source or the source
+  // reduced to the display, covering the rectangle the result will be given;
+  // sourcePixels answers its pixmap as it stands. The hub owns both.
+  PResult(PImageHub& hub, PRenderContext& run, Tarsa::CPixProcess& source,
+          std::function<Tarsa::CVirtualPixmap*()> sourcePixels, bool sourceHasAlpha);
   ~PResult() override;
 
   // Takes the solved mesh and indexes it for rect; the only operation that
@@ -146,6 +151,9 @@ class PResult : public Tarsa::CPixProcess {
 
   PImageHub& hub_;
   PRenderContext& run_;
+  Tarsa::CPixProcess& source_;
+  std::function<Tarsa::CVirtualPixmap*()> sourcePixels_;
+  bool sourceHasAlpha_;
   std::unique_ptr<Tarsa::CVirtualPixmap> pixels_;
   Tarsa::CRect rect_;
   std::int32_t resultWidth_ = 0;
