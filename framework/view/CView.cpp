@@ -88,6 +88,7 @@ void CView::ResizeBy(std::int32_t dx, std::int32_t dy) {
   ClampScroll();
   if (dx != 0 || dy != 0) {
     for (CView* child : children_) child->ParentResized(dx, dy);
+    SizeChanged(dx, dy);
   }
 }
 
@@ -134,6 +135,7 @@ void CView::ScrollTo(CPoint where) {
   imageRight_ = x + size.width;
   imageBottom_ = y + size.height;
   Invalidate();
+  Scrolled();
 }
 
 void CView::ScrollBy(std::int32_t dx, std::int32_t dy) {

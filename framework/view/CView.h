@@ -68,6 +68,11 @@ class CView : public virtual CMessenger {
   void ClampScroll();
   // Whether pinning moves the content rather than the image.
   virtual bool PinsByMovingContent() const { return false; }
+  // Called after the frame's size changed (children have followed already),
+  // and after ScrollTo moved the image: a scrolled view keeps what depends
+  // on its visible part up to date here.
+  virtual void SizeChanged(std::int32_t /*dx*/, std::int32_t /*dy*/) {}
+  virtual void Scrolled() {}
 
   CPoint LocalToWindow(CPoint p) const;
   CPoint WindowToLocal(CPoint p) const;
