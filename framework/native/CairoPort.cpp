@@ -1,5 +1,7 @@
 #include "framework/native/CairoPort.h"
 
+#include "framework/view/CPath.h"
+
 #include <pango/pangocairo.h>
 
 #include <algorithm>
@@ -151,6 +153,53 @@ void CairoPort::FocusRect(const CRect& rect, std::uint32_t argb) {
                   double(rect.Height()) - 1);
   cairo_stroke(cairo_);
   cairo_restore(cairo_);
+}
+
+void CairoPort::SetPath(const CPath& path) {
+  cairo_new_path(cairo_);
+  for (const CPath::CElement& e : path.Elements()) {
+    switch (e.verb) {
+      case CPath::EVerb::kMove:
+        cairo_move_to(cairo_, e.point.x, e.point.y);
+        break;
+      case CPath::EVerb::kLine:
+        cairo_line_to(cairo_, e.point.x, e.point.y);
+        break;
+      case CPath::EVerb::kArc:
+        if (e.to >= e.from) {
+          cairo_arc(cairo_, e.point.x, e.point.y, e.radius, e.from, e.to);
+        } else {
+          cairo_arc_negative(cairo_, e.point.x, e.point.y, e.radius, e.from, e.to);
+        }
+        break;
+      case CPath::EVerb::kClose:
+        cairo_close_path(cairo_);
+        break;
+    }
+  }
+}
+
+void CairoPort::StrokePath(const CPath& path, const CStrokeStyle& style) {
+  if (path.IsEmpty()) return;
+  cairo_save(cairo_);
+  SetColor(style.argb);
+  cairo_set_line_width(cairo_, style.width);
+  cairo_set_dash(cairo_, style.dashes.data(), static_cast<int>(style.dashes.size()),
+                 style.dashOffset);
+  SetPath(path);
+  cairo_stroke(cairo_);
+  cairo_restore(cairo_);
+}
+
+void CairoPort::FillPath(const CPath& path, std::uint32_t argb) {
+  if (path.IsEmpty()) return;
+  SetColor(argb);
+  SetPath(path);
+  cairo_fill(cairo_);
+}
+
+void CairoPort::SetAntialias(bool on) {
+  cairo_set_antialias(cairo_, on ? CAIRO_ANTIALIAS_DEFAULT : CAIRO_ANTIALIAS_NONE);
 }
 
 CSize CairoPort::MeasureText(std::string_view text, EFont font) {

@@ -30,6 +30,9 @@ class CairoPort : public CPort {
   void Line(CPointF from, CPointF to, std::uint32_t argb, double width) override;
   void FillPolygon(std::span<const CPointF> points, std::uint32_t argb) override;
   void FocusRect(const CRect& rect, std::uint32_t argb) override;
+  void StrokePath(const CPath& path, const CStrokeStyle& style) override;
+  void FillPath(const CPath& path, std::uint32_t argb) override;
+  void SetAntialias(bool on) override;
 
   CSize MeasureText(std::string_view text, EFont font) override;
   void DrawText(std::string_view text, const CRect& box, EFont font, std::uint32_t argb,
@@ -44,6 +47,8 @@ class CairoPort : public CPort {
  private:
   void SetColor(std::uint32_t argb);
   void RoundRectPath(double x, double y, double w, double h, double r);
+  // Replaces cairo's current path by the path.
+  void SetPath(const CPath& path);
 
   cairo_t* cairo_;
 };

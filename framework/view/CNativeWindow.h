@@ -6,6 +6,7 @@
 
 #include "framework/core/CRect.h"
 #include "framework/process/CNativeEventSource.h"
+#include "framework/view/COffscreenImage.h"
 #include "framework/view/CPort.h"
 
 namespace Tarsa {
@@ -54,6 +55,10 @@ class CNativeWindow {
 
 // A port that draws nowhere, for measuring text before a window is laid out.
 std::unique_ptr<CPort> CreateMeasuringPort();
+
+// A transparent image of that size in memory, with its port; it needs no
+// display.
+std::unique_ptr<COffscreenImage> CreateOffscreenImage(CSize size);
 
 // Opens a window of the kind, hidden, over the parent when one is given
 // (a modal window stays above it and blocks it). Throws CError when the

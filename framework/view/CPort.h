@@ -3,6 +3,7 @@
 #include <cstdint>
 #include <span>
 #include <string_view>
+#include <vector>
 
 #include "framework/core/CRect.h"
 
@@ -19,6 +20,18 @@ struct CPointF {
   double y = 0.0;
 };
 
+class CPath;
+
+// How a path is stroked: the colour, whose alpha is the opacity, the pen
+// width, and a dash pattern of lengths drawn and skipped in turn, entered
+// dashOffset along; no dashes draw a solid line.
+struct CStrokeStyle {
+  std::uint32_t argb = 0xFF000000;
+  double width = 1.0;
+  std::vector<double> dashes;
+  double dashOffset = 0.0;
+};
+
 // A drawing port: what views draw with, in the coordinates of the view being
 // drawn (the window moves the origin and clips for each view). Colours are
 // 0xAARRGGBB words. Lines are centred on their path; FrameRect's 1-pixel
@@ -28,7 +41,8 @@ class CPort {
  public:
   virtual ~CPort() = default;
 
-  // A saved state: origin and clip. Every Save is matched by a Restore.
+  // A saved state: origin, clip and anti-aliasing. Every Save is matched by
+  // a Restore.
   virtual void Save() = 0;
   virtual void Restore() = 0;
   virtual void Translate(std::int32_t dx, std::int32_t dy) = 0;
@@ -46,6 +60,15 @@ class CPort {
   virtual void FillPolygon(std::span<const CPointF> points, std::uint32_t argb) = 0;
   // A dotted rectangle, one pixel inside rect: the keyboard focus.
   virtual void FocusRect(const CRect& rect, std::uint32_t argb) = 0;
+
+  // Any shape: all its subpaths in one stroke, so that dashes run on along
+  // a path and overlapping translucent pieces are not darkened twice.
+  virtual void StrokePath(const CPath& path, const CStrokeStyle& style) = 0;
+  // The inside of all its subpaths (non-zero winding), open ones closed.
+  virtual void FillPath(const CPath& path, std::uint32_t argb) = 0;
+  // Whether shapes get soft, anti-aliased edges (the default) or hard ones
+  // on whole pixels; kept and put back by Save and Restore.
+  virtual void SetAntialias(bool on) = 0;
 
   // The text's size in the font, one line.
   virtual CSize MeasureText(std::string_view text, EFont font) = 0;
