@@ -19,6 +19,7 @@
 #include "framework/layout/CPaneBuilder.h"
 #include "framework/layout/CPlaceholderPane.h"
 #include "framework/layout/CWindowBuilder.h"
+#include "framework/layout/ZoomBuilders.h"
 
 namespace Tarsa {
 namespace {
@@ -262,6 +263,7 @@ void RegisterPanes() {
 void RegisterFrameworkBuilders() {
   RegisterControls();
   RegisterPanes();
+  RegisterZoomBuilders();
 }
 
 }  // namespace Tarsa

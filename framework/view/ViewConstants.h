@@ -125,4 +125,21 @@ inline constexpr std::uint32_t kBind_ScrollTopRight = kBind_Scrollable | kBind_P
 inline constexpr std::uint32_t kBind_ScrollBottomLeft = kBind_Scrollable | kBind_PinBottomLeft;
 inline constexpr std::uint32_t kBind_ScrollBottomRight = kBind_Scrollable | kBind_PinBottomRight;
 
+// A scroller's parts, and the places in a scroller a child can ask for
+// (frame_interior), as layout files write them.
+inline constexpr std::uint32_t kScroller_NoControls = 0;
+inline constexpr std::uint32_t kScroller_XBar = 1;
+inline constexpr std::uint32_t kScroller_YBar = 2;
+inline constexpr std::uint32_t kScroller_SizeBox = 4;
+inline constexpr std::uint32_t kScroller_WellFrame = 8;
+inline constexpr std::uint32_t kScroller_AutoHideScrollBars = 16;
+inline constexpr std::uint32_t kScroller_AllControls = 7;
+inline constexpr std::int32_t kInterior_ScrollerPane = 100;
+inline constexpr std::int32_t kInterior_ScrollerGapLeft = 101;
+inline constexpr std::int32_t kInterior_ScrollerGapTop = 102;
+inline constexpr std::int32_t kInterior_ScrollerGapRight = 103;
+inline constexpr std::int32_t kInterior_ScrollerGapBottom = 104;
+// The width a zoom combo is given.
+inline constexpr std::int32_t kZoomCombo_DefaultWidth = 110;
+
 }  // namespace Tarsa
