@@ -19,6 +19,9 @@ void ConfigureZoomPane(CZoomPane& pane, const CZilPropertyList& properties) {
   if (hasMin || hasMax) pane.SetZoomLimits(zoomMin, zoomMax);
   std::int32_t cushion = pane.FitCushion();
   if (properties.GetInt("fit_in_view_cushion", cushion)) pane.SetFitCushion(cushion);
+  // The layout placed the pane as one of a column; in a scroller it goes
+  // where the bars leave room.
+  if (auto* scroller = dynamic_cast<CScroller*>(pane.Parent())) scroller->Arrange();
 }
 
 void ConfigureScroller(CScroller& scroller, const CZilPropertyList& properties) {
