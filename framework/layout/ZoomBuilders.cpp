@@ -1,5 +1,9 @@
 #include "framework/layout/ZoomBuilders.h"
 
+#include <cstdlib>
+#include <string>
+#include <string_view>
+
 #include "framework/controls/CZoomProgressCombo.h"
 #include "framework/layout/CZilPropertyList.h"
 
@@ -9,13 +13,25 @@ namespace {
 // The combo's width, and the height of a scroll bar's row.
 constexpr CSize kComboSize{kZoomCombo_DefaultWidth, 18};
 
+// A number written as an int or as a text such as '0.001'. A text of four
+// characters is an int too (its character code), which must not win.
+bool Number(const CZilPropertyList& properties, std::string_view name, double& out) {
+  std::string text;
+  if (!properties.GetString(name, text)) return properties.GetDouble(name, out);
+  char* end = nullptr;
+  const double value = std::strtod(text.c_str(), &end);
+  if (end == text.c_str()) return false;
+  out = value;
+  return true;
+}
+
 }  // namespace
 
 void ConfigureZoomPane(CZoomPane& pane, const CZilPropertyList& properties) {
   double zoomMin = pane.ZoomMin();
   double zoomMax = pane.ZoomMax();
-  const bool hasMin = properties.GetDouble("zoom_min", zoomMin);
-  const bool hasMax = properties.GetDouble("zoom_max", zoomMax);
+  const bool hasMin = Number(properties, "zoom_min", zoomMin);
+  const bool hasMax = Number(properties, "zoom_max", zoomMax);
   if (hasMin || hasMax) pane.SetZoomLimits(zoomMin, zoomMax);
   std::int32_t cushion = pane.FitCushion();
   if (properties.GetInt("fit_in_view_cushion", cushion)) pane.SetFitCushion(cushion);
