@@ -8,28 +8,6 @@ namespace Project {
 
 bool ConstraintEnv::ShowsResult() const { return context.Settings().previewResult != 0; }
 
-void ScreenBounds::Merge(const ScreenBounds& other) {
-  if (other.IsEmpty()) return;
-  if (IsEmpty()) {
-    *this = other;
-    return;
-  }
-  Widen({other.left, other.top});
-  Widen({other.right, other.bottom});
-}
-
-ConstraintLook LookOf(const LineRecord& record) {
-  if (!record.active) return ConstraintLook::kInvalid;
-  if (!record.hasFixedNormal) return ConstraintLook::kOrdinary;
-  if (record.fixedNormal[0] == 0.0f && record.fixedNormal[1] == 1.0f) {
-    return ConstraintLook::kHorizontal;
-  }
-  if (record.fixedNormal[0] == 1.0f && record.fixedNormal[1] == 0.0f) {
-    return ConstraintLook::kVertical;
-  }
-  return ConstraintLook::kFixed;
-}
-
 float SegmentDistanceSquared(Point2f p, Point2f a, Point2f b) {
   const float dx = b.x - a.x, dy = b.y - a.y;
   const float length2 = dx * dx + dy * dy;

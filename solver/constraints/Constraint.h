@@ -23,55 +23,6 @@ struct ConstraintEnv {
   bool ShowsResult() const;
 };
 
-// A view point to the window: point * zoom + origin - scroll, per axis.
-struct ScreenTransform {
-  float zoom = 1.0f;
-  float originX = 0.0f;
-  float originY = 0.0f;
-  float scrollX = 0.0f;
-  float scrollY = 0.0f;
-
-  Point2f Apply(Point2f p) const {
-    return {originX + p.x * zoom - scrollX, originY + p.y * zoom - scrollY};
-  }
-};
-
-// How the list marks a constraint when it is shown.
-struct Highlight {
-  bool selected = false;
-  bool hovered = false;
-  // Degrees; the angle shown while a line is being rotated, or below 0.
-  float liveRotation = -1.0f;
-};
-
-// A rectangle of the window. It counts as empty when it has neither width
-// nor height, so the starting boxes (10000, 10000, 0, 0) and (0, 0, 0, 0)
-// are both empty while the box of a straight horizontal edge is not.
-struct ScreenBounds {
-  float left = 0.0f;
-  float top = 0.0f;
-  float right = 0.0f;
-  float bottom = 0.0f;
-
-  bool IsEmpty() const { return !(right > left) && !(bottom > top); }
-  // Widens the box by a point, min and max on each side.
-  void Widen(Point2f p) {
-    left = p.x < left ? p.x : left;
-    top = p.y < top ? p.y : top;
-    right = p.x > right ? p.x : right;
-    bottom = p.y > bottom ? p.y : bottom;
-  }
-  // The union, an empty box giving way to the other one.
-  void Merge(const ScreenBounds& other);
-};
-
-// The colour a traced record is shown in.
-enum class ConstraintLook { kOrdinary, kHorizontal, kVertical, kFixed, kInvalid };
-
-// By the record: invalid when tracing failed, else by its pinned normal,
-// exactly (0, 1) horizontal and exactly (1, 0) vertical.
-ConstraintLook LookOf(const LineRecord& record);
-
 // The squared distance from p to the segment a to b, measured to the foot of
 // the perpendicular clamped to the segment; a zero-length segment is a.
 float SegmentDistanceSquared(Point2f p, Point2f a, Point2f b);
@@ -93,9 +44,6 @@ class Constraint {
   virtual ~Constraint() = default;
 
   virtual std::unique_ptr<Constraint> Clone() const = 0;
-  // The window's box of everything the constraint shows, handles included.
-  virtual ScreenBounds Measure(const ConstraintEnv& env, const ScreenTransform& screen,
-                               const Highlight& highlight) const = 0;
   // Bytes of its record in the stored blob.
   virtual std::size_t GetSerializedSize() const = 0;
   std::int32_t GetId() const { return id_; }

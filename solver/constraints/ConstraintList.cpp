@@ -171,17 +171,6 @@ LineConstraint* ConstraintList::PickRotationHandle(Point2f point, float toleranc
   return line;
 }
 
-bool ConstraintList::GetSelectedBounds(const ScreenTransform& screen, ScreenBounds& outBounds) {
-  const Constraint* first = FirstSelected();
-  if (first == nullptr) return false;
-  outBounds = first->Measure(Env(), screen, HighlightOf(*first));
-  return true;
-}
-
-Highlight ConstraintList::HighlightOf(const Constraint& constraint) const {
-  return {IsSelected(constraint), constraint.GetId() == hoverId_, liveRotation_};
-}
-
 void ConstraintList::RegisterAll(Solver& solver) {
   for (const auto& item : items_) item->Register(solver);
 }

@@ -96,10 +96,6 @@ class ConstraintList final : public ConstraintSet {
   // unit.
   LineConstraint* PickRotationHandle(Point2f point, float tolerance, float zoom,
                                      std::int32_t& outCursor);
-  // The window's box of the first selected item; false when none is.
-  bool GetSelectedBounds(const ScreenTransform& screen, ScreenBounds& outBounds);
-  // How the item is to be marked when shown.
-  Highlight HighlightOf(const Constraint& constraint) const;
 
   // --- The solver's side ---
 

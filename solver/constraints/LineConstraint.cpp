@@ -19,16 +19,8 @@ constexpr double kStoredPi = 3.1416;
 constexpr float kShortLine = 60.0f;
 constexpr float kShortLineLength = 120.0f;
 constexpr float kGripRadiusFactor = 0.6f;
-// Half sides of the handle squares and of the round grips, window pixels.
-constexpr float kHandleHalf = 3.5f;
-constexpr float kGripHalf = 4.5f;
 
 float Distance(Point2f a, Point2f b) { return std::hypot(a.x - b.x, a.y - b.y); }
-
-void WidenSquare(ScreenBounds& bounds, Point2f centre, float half) {
-  bounds.Widen({centre.x - half, centre.y - half});
-  bounds.Widen({centre.x + half, centre.y + half});
-}
 
 }  // namespace
 
@@ -44,11 +36,6 @@ std::unique_ptr<LineConstraint> LineConstraint::CloneLine() const {
   clone->SetId(GetId());
   clone->orientation_ = GetOrientation(&clone->angle_);
   return clone;
-}
-
-ScreenBounds LineConstraint::Measure(const ConstraintEnv& env, const ScreenTransform& screen,
-                                     const Highlight& highlight) const {
-  return Layout(env, screen, highlight).bounds;
 }
 
 bool LineConstraint::IsValid(const Solver& solver) const {
@@ -202,54 +189,6 @@ bool LineConstraint::HasFocalHandle(const ConstraintEnv& env) const {
   auto inImage = [&](Point2f p) { return p.x >= 0 && p.x <= width && p.y >= 0 && p.y <= height; };
   if (!inImage(start_) || !inImage(end_)) return false;
   return !env.ShowsResult() || IsValid(env.solver);
-}
-
-LineLayout LineConstraint::Layout(const ConstraintEnv& env, const ScreenTransform& screen,
-                                  const Highlight& highlight) const {
-  LineLayout layout;
-  const bool shown = env.ShowsResult();
-  const bool valid = IsValid(env.solver);
-  const LineRecord& record = LineRecordOf(env.solver, GetId());
-  layout.look = LookOf(record);
-  layout.ends = {screen.Apply(shown ? displayStart_ : start_),
-                 screen.Apply(shown ? displayEnd_ : end_)};
-  if (valid) {
-    layout.path.reserve(curve_.size());
-    for (const Point2f& p : curve_) layout.path.push_back(screen.Apply(p));
-  } else {
-    layout.path = {layout.ends[0], layout.ends[1]};
-    layout.dashed = true;
-  }
-
-  layout.middle = screen.Apply(GetPointAlong(env, 0.5f));
-  if (highlight.selected || highlight.hovered) {
-    layout.handleOpacity = highlight.selected ? 1.0f : 0.5f;
-    layout.hasFocalHandle = HasFocalHandle(env);
-  }
-  GetOrientation(&layout.axisAngle);
-  const float gripAngle =
-      highlight.liveRotation >= 0.0f ? highlight.liveRotation : layout.axisAngle;
-  RotationGadget& gadget = layout.gadget;
-  if (highlight.selected && valid && GetRotationGadget(env, screen.zoom, gripAngle, gadget)) {
-    layout.hasGadget = true;
-    gadget.middle = screen.Apply(gadget.middle);
-    gadget.radius *= screen.zoom;
-    for (Point2f& grip : gadget.grips) grip = screen.Apply(grip);
-  }
-
-  // The bounds the drawing may touch: the path, the end handles, the grip
-  // squares at a fifth and four fifths of the line, and the gadget circle.
-  ScreenBounds& bounds = layout.bounds;
-  bounds = {10000.0f, 10000.0f, 0.0f, 0.0f};
-  for (const Point2f& p : layout.path) bounds.Widen(p);
-  for (const Point2f& end : layout.ends) WidenSquare(bounds, end, kHandleHalf);
-  for (const float fraction : {0.2f, 0.8f}) {
-    const Point2f p = GetPointAlong(env, fraction);
-    if (p.x == -1.0f && p.y == -1.0f) continue;
-    WidenSquare(bounds, screen.Apply(p), kGripHalf);
-  }
-  if (layout.hasGadget) WidenSquare(bounds, gadget.middle, gadget.radius);
-  return layout;
 }
 
 bool LineConstraint::GetRotationGadget(const ConstraintEnv& env, float zoom, float angleDegrees,

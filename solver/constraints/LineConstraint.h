@@ -20,29 +20,6 @@ struct RotationGadget {
   std::array<Point2f, 2> grips{};
 };
 
-// What the window shows of a line, in window coordinates: the geometry the
-// drawing layer paints, computed once so that painting and measuring agree.
-struct LineLayout {
-  ConstraintLook look = ConstraintLook::kOrdinary;
-  // The traced curve; for a failed trace the straight segment between the
-  // ends, drawn dashed.
-  std::vector<Point2f> path;
-  bool dashed = false;
-  // End handles: opacity 1 when selected, 0.5 when only hovered, else none.
-  std::array<Point2f, 2> ends{};
-  float handleOpacity = 0.0f;
-  // The middle of the curve, where the focal handle stands when there is
-  // one.
-  Point2f middle{};
-  bool hasFocalHandle = false;
-  // A selected, valid line's gadget, its grips at the live rotation while
-  // there is one, else at the orientation's angle (degrees).
-  bool hasGadget = false;
-  RotationGadget gadget;
-  float axisAngle = 0.0f;
-  ScreenBounds bounds;
-};
-
 // A line constraint: the user asserts that the pixels between two end points
 // lie on a straight line of the world. Only the ends are the user's; the
 // great-circle arc between their sphere directions is traced into a record
@@ -75,8 +52,6 @@ class LineConstraint final : public Constraint {
   // angle is the one computed now. The curve is left for Update.
   std::unique_ptr<Constraint> Clone() const override;
   std::unique_ptr<LineConstraint> CloneLine() const;
-  ScreenBounds Measure(const ConstraintEnv& env, const ScreenTransform& screen,
-                       const Highlight& highlight) const override;
   std::size_t GetSerializedSize() const override { return kSerializedSize; }
   bool IsValid(const Solver& solver) const override;
   bool HitTest(const ConstraintEnv& env, Point2f point, bool inWarpedView,
@@ -111,8 +86,6 @@ class LineConstraint final : public Constraint {
   // A fisheye photo, both ends in the image, and with the result shown a
   // valid trace: the line can calibrate the focal length.
   bool HasFocalHandle(const ConstraintEnv& env) const;
-  LineLayout Layout(const ConstraintEnv& env, const ScreenTransform& screen,
-                    const Highlight& highlight) const;
   // The gadget in the view's coordinates, for a view shown at zoom window
   // pixels per unit, its grips along angleDegrees; false when the line has
   // no middle.

@@ -10,10 +10,6 @@ namespace Project {
 
 namespace {
 
-// Handles show from this opacity up: a selected polygon (1) and a hovered
-// one (0.5), not the others (0).
-constexpr float kHandleThreshold = 0.4f;
-
 // Pins an edge's normal by its orientation; other values leave it alone.
 void ApplyEdgeOrientation(LineRecord& edge, std::int32_t orientation) {
   switch (orientation) {
@@ -54,11 +50,6 @@ std::unique_ptr<Constraint> PlaneConstraint::Clone() const {
   auto clone = std::make_unique<PlaneConstraint>();
   *clone = *this;
   return clone;
-}
-
-ScreenBounds PlaneConstraint::Measure(const ConstraintEnv& env, const ScreenTransform& screen,
-                                      const Highlight& highlight) const {
-  return Layout(env, screen, highlight).bounds;
 }
 
 bool PlaneConstraint::HitTest(const ConstraintEnv& env, Point2f point, bool inWarpedView,
@@ -249,48 +240,6 @@ bool PlaneConstraint::Rebuild(Solver& solver) {
   if (!valid_) RemoveRecord(store.GetPlanes(), GetId());
   store.ClearDraftPlane();
   return true;
-}
-
-PlaneLayout PlaneConstraint::Layout(const ConstraintEnv& env, const ScreenTransform& screen,
-                                    const Highlight& highlight) const {
-  PlaneLayout layout;
-  // The selection wins over the hover.
-  layout.handleOpacity = highlight.selected ? 1.0f : (highlight.hovered ? 0.5f : 0.0f);
-  const bool handles = layout.handleOpacity > kHandleThreshold;
-  const std::vector<PlaneCorner>& shown = env.ShowsResult() ? displayCorners_ : corners_;
-  if (!valid_) {
-    layout.dashed = true;
-    const std::size_t n = shown.size();
-    for (std::size_t k = 0; k < n; ++k) {
-      const Point2f a = screen.Apply(At(shown[k]));
-      const Point2f b = screen.Apply(At(shown[(k + 1) % n]));
-      layout.edges.push_back({a, b});
-      layout.looks.push_back(ConstraintLook::kInvalid);
-      ScreenBounds segment{a.x, a.y, a.x, a.y};
-      segment.Widen(b);
-      layout.bounds.Merge(segment);
-      if (handles && k > 0) layout.handles.push_back(a);
-    }
-    if (handles && n > 0) layout.handles.push_back(screen.Apply(At(shown[0])));
-    return layout;
-  }
-  const PlaneRecord* record = FindRecord(env.solver);
-  if (record == nullptr) return layout;
-  for (std::size_t k = 0; k < record->edges.size(); ++k) {
-    std::vector<Point2f>& path = layout.edges.emplace_back();
-    if (k < edgeCurves_.size()) {
-      for (const Point2f& p : edgeCurves_[k]) path.push_back(screen.Apply(p));
-    }
-    layout.looks.push_back(LookOf(record->edges[k]));
-    if (path.size() < 2) continue;
-    ScreenBounds edge{10000.0f, 10000.0f, 0.0f, 0.0f};
-    for (const Point2f& p : path) edge.Widen(p);
-    layout.bounds.Merge(edge);
-  }
-  if (handles) {
-    for (const PlaneCorner& corner : shown) layout.handles.push_back(screen.Apply(At(corner)));
-  }
-  return layout;
 }
 
 }  // namespace Project

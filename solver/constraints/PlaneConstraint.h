@@ -21,20 +21,6 @@ struct PlaneCorner {
   std::int32_t edgeOrientation = 1;
 };
 
-// What the window shows of a polygon, in window coordinates.
-struct PlaneLayout {
-  // Per edge: its traced curve, or for a polygon that failed to trace the
-  // straight segment between its corners, drawn dashed.
-  std::vector<std::vector<Point2f>> edges;
-  std::vector<ConstraintLook> looks;
-  bool dashed = false;
-  // Corner handles in painting order (the first corner last, on top), at
-  // handleOpacity; none below 0.4.
-  std::vector<Point2f> handles;
-  float handleOpacity = 0.0f;
-  ScreenBounds bounds;
-};
-
 // A polygon constraint: the user asserts that the region inside a closed
 // polygon is a flat surface of the world, so one homography must hold over
 // it, and that each edge is straight, possibly horizontal or vertical. The
@@ -56,8 +42,6 @@ class PlaneConstraint final : public Constraint {
   PlaneConstraint& operator=(const PlaneConstraint& other);
 
   std::unique_ptr<Constraint> Clone() const override;
-  ScreenBounds Measure(const ConstraintEnv& env, const ScreenTransform& screen,
-                       const Highlight& highlight) const override;
   std::size_t GetSerializedSize() const override { return 8 + 12 * corners_.size(); }
   bool IsValid(const Solver&) const override { return valid_; }
   bool HitTest(const ConstraintEnv& env, Point2f point, bool inWarpedView,
@@ -96,9 +80,6 @@ class PlaneConstraint final : public Constraint {
   // record in place), or takes its record out when it cannot be traced.
   // Always answers true; validity is IsValid.
   bool Rebuild(Solver& solver);
-
-  PlaneLayout Layout(const ConstraintEnv& env, const ScreenTransform& screen,
-                     const Highlight& highlight) const;
 
   const std::vector<PlaneCorner>& GetCorners() const { return corners_; }
   const std::vector<PlaneCorner>& GetDisplayCorners() const { return displayCorners_; }

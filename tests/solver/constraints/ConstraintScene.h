@@ -1,9 +1,13 @@
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <cmath>
+#include <initializer_list>
 #include <memory>
 
 #include "solver/constraints/ConstraintList.h"
+#include "solver/constraints/PlaneConstraint.h"
 #include "solver/frame/Solver.h"
 #include "solver/frame/SolverContext.h"
 #include "solver/geodesic/Vec3.h"
@@ -37,6 +41,30 @@ struct ConstraintScene {
   }
   Solver& solver() { return list.GetSolver(); }
   void UpdateAll() { list.UpdateDisplays(list.GetSolver(), -1); }
+
+  // A rectangle in the middle of the photo, (200, 120) to (400, 280), its
+  // top edge Horizontal, added and shown.
+  PlaneConstraint& AddRectangle() {
+    auto owned = std::make_unique<PlaneConstraint>();
+    owned->AddCorner({200, 120}, 2);
+    owned->AddCorner({400, 120}, 1);
+    owned->AddCorner({400, 280}, 1);
+    owned->AddCorner({200, 280}, 1);
+    PlaneConstraint& plane = *owned;
+    EXPECT_TRUE(list.Add(std::move(owned)));
+    UpdateAll();
+    return plane;
+  }
+  // Corners of the polygon a tool is drawing, in the preview, traced as the
+  // solver's draft.
+  void AddDraftPoints(std::initializer_list<Point2f> points) {
+    for (const Point2f p : points) {
+      const float view[2] = {p.x, p.y};
+      float fraction[2];
+      solver().ViewToPlane(view, fraction, 0);
+      solver().GetLines()->AddDraftPoint(fraction, false, 0);
+    }
+  }
 
   // The sphere direction of a preview point of the pinhole photo, from its
   // own formula: x = f tan(lon), y = f tan(lat) / cos(lon) about the centre.
