@@ -17,9 +17,11 @@ constexpr std::uint32_t kWhite = 0xFFFFFFFF;
 constexpr std::uint32_t kBlack = 0xFF000000;
 // The rotation gadget's circle and short axis: grey at 0.85.
 constexpr std::uint32_t kGadgetGrey = 0xD9808080;
-// A failed trace's dashes, and the focal joint's, in window pixels.
-const std::vector<double> kInvalidDashes{4.0, 2.0};
-const std::vector<double> kJointDashes{4.0, 4.0};
+// A failed trace's dashes and gaps, and the focal joint's, in window
+// pixels.
+constexpr double kInvalidDash = 4.0;
+constexpr double kInvalidGap = 2.0;
+constexpr double kJointDash = 4.0;
 // Twice the signed area below which the live focal handle and the line's
 // ends count as collinear, and the arc through them as straight.
 constexpr double kCollinear = 1e-6;
@@ -131,7 +133,8 @@ void ConstraintPainter::PaintCurve(const std::vector<Point2f>& viewCurve, std::u
 }
 
 void ConstraintPainter::PaintInvalidSegment(Point2f a, Point2f b, OverlayCanvas& canvas) {
-  canvas.Stroke(Segment(a, b), {list_.Context().Settings().colorInvalid, 1.0, kInvalidDashes, 0.0});
+  canvas.Stroke(Segment(a, b),
+                {list_.Context().Settings().colorInvalid, 1.0, {kInvalidDash, kInvalidGap}, 0.0});
 }
 
 void ConstraintPainter::PaintLine(const LineConstraint& line, const Highlight& highlight,
@@ -208,8 +211,8 @@ void ConstraintPainter::PaintLiveFocal(const Highlight& highlight, Point2f middl
   const Point2f handle = screen_.Apply(view);
   // White and black dashes in turn, so that the joint shows on any picture.
   const Tarsa::CPath joint = Segment(middle, handle);
-  canvas.Stroke(joint, {kWhite, 1.0, kJointDashes, 0.0});
-  canvas.Stroke(joint, {kBlack, 1.0, kJointDashes, 4.0});
+  canvas.Stroke(joint, {kWhite, 1.0, {kJointDash, kJointDash}, 0.0});
+  canvas.Stroke(joint, {kBlack, 1.0, {kJointDash, kJointDash}, kJointDash});
   Tarsa::CPath arc;
   if (ArcThrough(first, handle, second, arc)) {
     canvas.Stroke(arc, {colour, 1.0, {}, 0.0});
