@@ -80,6 +80,8 @@ class CZoomProgressCombo : public CControl {
   void Click(CMouseMessage& message) override;
   void HandleMessage(CMessage& message) override;
   void Draw(CPort& port) override;
+  // The pane may have come after the combo in the layout.
+  void OnStart() override { UpdateZoomControls(); }
 
  protected:
   void OnBecameTarget() override;
