@@ -69,6 +69,10 @@ std::int32_t CScroller::BottomRow() const {
 }
 
 void CScroller::Arrange() {
+  // A gap view deleted since it was set is forgotten.
+  if (std::find(Children().begin(), Children().end(), gapView_) == Children().end()) {
+    gapView_ = nullptr;
+  }
   const CRect inner = Inner();
   const std::int32_t bottom = BottomRow();
   const std::int32_t right = YBar() != nullptr ? CScrollBar::kThickness : 0;

@@ -179,17 +179,5 @@ TEST_F(ZoomWindow, TheLayoutBuildsAScrollerWhoseBarsComboAndWheelDriveThePane) {
   EXPECT_FALSE(combo_->InProgress());
 }
 
-TEST_F(ZoomWindow, ResizingTheWindowPlacesBarsAndComboAgain) {
-  ASSERT_EQ(desktop_->Xdo({"windowsize", "--sync", xid_, "700", "520"}), 0);
-  desktop_->Pump(0.3);
-  const CSize size = scroller_->Size();
-  EXPECT_EQ(scroller_->YBar()->Frame().right, size.width - 1);
-  EXPECT_EQ(scroller_->XBar()->Frame().bottom, size.height - 1);
-  EXPECT_EQ(combo_->Frame().bottom, size.height - 1);
-  EXPECT_EQ(pane_->Frame().right, scroller_->YBar()->Frame().left);
-  EXPECT_EQ(pane_->Frame().bottom, combo_->Frame().top);
-  EXPECT_GT(pane_->Size().width, 480) << "the pane took the window's growth";
-}
-
 }  // namespace
 }  // namespace Tarsa::testing
