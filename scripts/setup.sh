@@ -10,6 +10,7 @@ packages=(
   libegl-dev libgl-dev libglu1-mesa-dev libegl-mesa0 libgl1-mesa-dri
   libsdl2-dev libx11-dev libcairo2-dev libpango1.0-dev fonts-dejavu-core xvfb xauth xdotool
   libexiv2-dev
+  liblcms2-dev libgs-common  # display colour: LittleCMS, and a CMYK press profile it reads
   libexempi-dev
   libsuitesparse-dev libopenblas-dev libtbb-dev
   clang-14 libclang-rt-14-dev  # the fuzz targets: clang with libFuzzer's runtime
