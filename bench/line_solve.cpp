@@ -10,14 +10,17 @@
 // preparation, iteration assembly, ordering, factorisation, triangular
 // solves, and the rest: rotation, mesh collection, the constraints' shown
 // forms); the peak resident memory the solve added (the kernel's high-water
-// mark, reset before it) and the sparse library's own peak. BM_Quality
-// solves more scenes once each and reports how straight the lines end and
-// how conformal the rest stays.
+// mark, reset before it) and the sparse library's own peak. BM_Roads sets
+// the kept-factor road against factoring every system, at mesh levels 5 to
+// 8, and reports how far the two meshes lie apart. BM_Quality solves more
+// scenes once each and reports how straight the lines end and how conformal
+// the rest stays.
 #include <benchmark/benchmark.h>
 
 #include <malloc.h>
 #include <algorithm>
 #include <chrono>
+#include <cmath>
 #include <cstdio>
 #include <cstring>
 #include <fstream>
@@ -46,9 +49,15 @@ struct Variant {
   std::int32_t level = 6;
   bool gaussNewton = true;
   bool cacheOrder = false;
+  // Systems solved on the last factor where it serves (the default road),
+  // or every one factored afresh.
+  bool keepFactor = true;
   // Time the edit that adds the last line to the others, solved already,
   // rather than the solve of all of them on the plain mesh.
   bool edit = false;
+  // Time a drag instead: the last line's end moved a few pixels, back and
+  // forth, each time solved again.
+  bool drag = false;
 };
 
 struct Timing {
@@ -57,6 +66,10 @@ struct Timing {
   SolveProfile profile;
   double peakMiB = 0.0;
 };
+
+// The drag's step in photograph pixels, about what a mouse moves between
+// two previews.
+constexpr float kDragPixels = 3.0f;
 
 // A scene of one variant: its lines, and a timed solve after putting them
 // back on the plainly solved mesh, or after adding the last of them.
@@ -69,9 +82,11 @@ class Bench {
                  s.gaussNewtonSolver = variant.gaussNewton ? 1 : 0;
                  s.cacheDssPermutation = variant.cacheOrder ? 1 : 0;
                }),
-        edit_(variant.edit) {
+        edit_(variant.edit),
+        drag_(variant.drag),
+        keepFactor_(variant.keepFactor) {
     lines_ = scene_.Pick(variant.lines, true);
-    if (edit_) {
+    if (edit_ || drag_) {
       // The line added is a free one: it leaves the verticals, and so the
       // grid's rotation, as they were.
       const auto free = std::find_if(lines_.rbegin(), lines_.rend(), [](const PickedLine& line) {
@@ -82,7 +97,23 @@ class Bench {
   }
 
   Timing Run() {
-    if (edit_ && !lines_.empty()) {
+    Warp();
+    if (drag_ && !lines_.empty()) {
+      if (!solvedBefore_) {
+        scene_.AddLines(lines_);
+        scene_.solver().Solve(true, false);
+        solvedBefore_ = true;
+      }
+      const PickedLine& last = lines_.back();
+      if (const Constraint* line = scene_.list.Find(last.constraintId)) {
+        const auto& moved = dynamic_cast<const LineConstraint&>(*line);
+        Point2f end = moved.GetEnd();
+        end.y += (++drags_ % 2 == 1 ? kDragPixels : -kDragPixels) /
+                 static_cast<float>(scene_.context.SourceHeight());
+        LineConstraint shape(moved.GetStart(), end);
+        scene_.list.Replace(last.constraintId, shape);
+      }
+    } else if (edit_ && !lines_.empty()) {
       if (!solvedBefore_) {
         std::vector<PickedLine> before(lines_.begin(), lines_.end() - 1);
         scene_.AddLines(before);
@@ -99,7 +130,7 @@ class Bench {
       scene_.solver().Solve(true, false);
       scene_.AddLines(lines_);
     }
-    auto* warp = dynamic_cast<IterativeWarpSolver*>(scene_.solver().GetWarp().get());
+    IterativeWarpSolver* warp = Warp();
     warp->ClearProfile();
     malloc_trim(0);
     ResetPeak();
@@ -118,11 +149,40 @@ class Bench {
   std::size_t LineCount() const { return lines_.size(); }
   bool Failed() const { return scene_.context.failures != 0; }
 
+  // The largest distance between this mesh and the other's, in pixels of an
+  // output of the photograph's width that shows the whole mesh.
+  double MaxMovePixels(Bench& other) {
+    Solver& solver = scene_.solver();
+    const std::vector<float>& a = solver.Positions();
+    const std::vector<float>& b = other.scene_.solver().Positions();
+    if (a.size() != b.size()) return -1.0;
+    double worst = 0.0;
+    const std::int32_t n = solver.GridSize();
+    for (std::int32_t j = 0; j < n; ++j) {
+      for (std::int32_t i = 0; i < n; ++i) {
+        if (!solver.GetWarp()->IsVertexInside(i, j)) continue;
+        const std::size_t at = (static_cast<std::size_t>(j) * n + i) * 2;
+        worst = std::max(worst, std::hypot(double(a[at]) - b[at], double(a[at + 1]) - b[at + 1]));
+      }
+    }
+    return worst * scene_.context.SourceWidth() / solver.FitBox(1).viewWidth;
+  }
+
  private:
+  // The solver's warp, on this bench's road.
+  IterativeWarpSolver* Warp() {
+    auto* warp = dynamic_cast<IterativeWarpSolver*>(scene_.solver().GetWarp().get());
+    warp->SetFactorReuse(keepFactor_);
+    return warp;
+  }
+
   QualityScene scene_;
   std::vector<PickedLine> lines_;
   bool edit_;
+  bool drag_;
+  bool keepFactor_;
   bool solvedBefore_ = false;
+  std::int32_t drags_ = 0;
 };
 
 // Runs the variant and the baseline alternately, times the variant, and
@@ -132,7 +192,11 @@ void RunPair(benchmark::State& state, const Variant& variant, const Variant& bas
   Bench bench(variant);
   Bench base(baseline);
   std::vector<double> total, perIteration, constant, prepare, assembly, analyse, factor, solve,
-      rest, peak, library, baseTotal, iterations;
+      rest, peak, library, baseTotal, iterations, factorizations, gradientSteps, basePerIteration,
+      basePeak, move;
+  // The two meshes are compared where both solved the same scene.
+  const bool same = variant.level == baseline.level && variant.lines == baseline.lines &&
+                    variant.edit == baseline.edit && variant.drag == baseline.drag;
   double factorNonzeros = 0.0, factorFlops = 0.0;
   for (auto _ : state) {
     const Timing t = bench.Run();
@@ -156,6 +220,11 @@ void RunPair(benchmark::State& state, const Variant& variant, const Variant& bas
     factorNonzeros = p.factorNonzeros;
     factorFlops = p.factorFlops;
     baseTotal.push_back(b.seconds * 1e3);
+    basePerIteration.push_back(b.iterations > 0 ? b.seconds * 1e3 / b.iterations : 0.0);
+    basePeak.push_back(b.peakMiB);
+    factorizations.push_back(p.factorizations);
+    gradientSteps.push_back(p.gradientSteps);
+    if (same) move.push_back(bench.MaxMovePixels(base));
   }
   if (bench.Failed() || base.Failed()) state.SkipWithError("a solve failed");
   state.counters["lines"] = static_cast<double>(bench.LineCount());
@@ -174,8 +243,42 @@ void RunPair(benchmark::State& state, const Variant& variant, const Variant& bas
   state.counters["factor_nnz"] = factorNonzeros;
   state.counters["factor_Mflop"] = factorFlops / 1e6;
   state.counters["baseline_ms"] = Median(baseTotal);
+  state.counters["baseline_per_iteration_ms"] = Median(basePerIteration);
+  state.counters["baseline_peak_MiB"] = Median(basePeak);
+  state.counters["factorizations"] = Median(factorizations);
+  state.counters["cg_steps"] = Median(gradientSteps);
+  if (same) state.counters["max_move_px"] = *std::max_element(move.begin(), move.end());
   state.counters[ratio] = Median(total) / Median(baseTotal);
 }
+
+// The kept-factor road beside factoring every system afresh, at mesh
+// levels 5 to 8 with 0, 10 and 40 lines, and for the interactive edits at
+// the default level: one line added, one line's end dragged.
+void BM_Roads(benchmark::State& state) {
+  Variant variant;
+  variant.level = static_cast<std::int32_t>(state.range(0));
+  variant.lines = static_cast<std::size_t>(state.range(1));
+  variant.edit = state.range(2) == 1;
+  variant.drag = state.range(2) == 2;
+  Variant baseline = variant;
+  baseline.keepFactor = false;
+  RunPair(state, variant, baseline, "vs_fresh_factor");
+}
+BENCHMARK(BM_Roads)
+    ->ArgNames({"level", "lines", "edit"})
+    ->ArgsProduct({{5, 6, 7}, {0, 10, 40}, {0}})
+    ->Args({6, 10, 1})
+    ->Args({6, 10, 2})
+    ->Args({6, 40, 2})
+    ->Iterations(5)
+    ->UseManualTime()
+    ->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Roads)
+    ->ArgNames({"level", "lines", "edit"})
+    ->ArgsProduct({{8}, {0, 10, 40}, {0}})
+    ->Iterations(1)
+    ->UseManualTime()
+    ->Unit(benchmark::kMillisecond);
 
 // 0, 10 and 40 lines beside the plain solve of no lines.
 void BM_Lines(benchmark::State& state) {

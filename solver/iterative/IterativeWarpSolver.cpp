@@ -6,8 +6,6 @@
 #include <functional>
 #include <utility>
 
-#include "solver/sparse/SparseSolve.h"
-
 namespace Project {
 
 namespace {
@@ -22,13 +20,25 @@ double SecondsSince(Clock::time_point start) {
   return std::chrono::duration<double>(Clock::now() - start).count();
 }
 
+// Which systems are solved on a kept factor, and how closely. Only one whose
+// entries moved by a millionth at most: a system of the Gauss-Newton road
+// changes with every step in its line rows, and those changes couple to the
+// nearly free similarity motions of the whole mesh (its anchors weigh
+// 0.001), so conjugate gradients on the last iteration's factor stalled at
+// a residual near 1e-3 after twelve steps, each some 5 ms. A residual 1e-8
+// of the right side's leaves the step exact to far below a pixel.
+constexpr PreconditionedLimits kNearFactor{1e-6, 1e-8, 4};
+
 void AddStats(SolveProfile& profile, const SparseSolveStats& stats) {
   profile.analyseSeconds += stats.analyseSeconds;
   profile.factorSeconds += stats.factorSeconds;
   profile.solveSeconds += stats.solveSeconds;
   profile.peakBytes = std::max(profile.peakBytes, stats.peakBytes);
-  profile.factorNonzeros = stats.factorNonzeros;
-  profile.factorFlops = stats.factorFlops;
+  // A solve on a kept factor reports none of its own.
+  if (stats.factorNonzeros > 0.0) {
+    profile.factorNonzeros = stats.factorNonzeros;
+    profile.factorFlops = stats.factorFlops;
+  }
 }
 
 }  // namespace
@@ -294,7 +304,17 @@ void IterativeWarpSolver::AssembleConstantPart() {
   profile_.constantSeconds += SecondsSince(start);
 }
 
-void IterativeWarpSolver::Reset() { constantAssembled_ = false; }
+void IterativeWarpSolver::Reset() {
+  constantAssembled_ = false;
+  // The constant part follows the grid's rotation: a factor of the old one
+  // is a poor start for the new.
+  if (sparse_ != nullptr) sparse_->DropFactor();
+}
+
+void IterativeWarpSolver::SetFactorReuse(bool reuse) {
+  reuseFactor_ = reuse;
+  if (!reuse) sparse_.reset();
+}
 
 void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
   EnsureConstantPart();
@@ -309,6 +329,23 @@ void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
   RelabelPermutationTail(order_, 2 * vertexCount_, unknowns);
 }
 
+bool IterativeWarpSolver::SolveSystem(SparseSession& sparse, bool tryKeptFactor,
+                                      const CompressedMatrix& system, std::span<const double> rhs,
+                                      std::span<double> answer) {
+  SparseSolveStats stats;
+  if (tryKeptFactor) {
+    const bool solved = sparse.SolvePreconditioned(system, rhs, answer, kNearFactor, &stats);
+    profile_.gradientSteps += stats.gradientSteps;
+    AddStats(profile_, stats);
+    if (solved) return true;
+    stats = SparseSolveStats{};
+  }
+  const bool solved = sparse.Solve(system, rhs, answer, order_, &stats);
+  ++profile_.factorizations;
+  AddStats(profile_, stats);
+  return solved;
+}
+
 void IterativeWarpSolver::Solve() {
   EnsureConstantPart();
   Clock::time_point start = Clock::now();
@@ -320,11 +357,17 @@ void IterativeWarpSolver::Solve() {
   // On the Gauss-Newton road the system keeps its pattern from one
   // iteration to the next, so it is ordered and analysed once; the other
   // road's two forms of line rows differ in pattern, and each change is
-  // analysed anew.
-  SparseSession sparse(settings_.useGaussNewton && settings_.usePardiso ? SparseRoad::kPardiso
-                                                                        : SparseRoad::kDss);
+  // analysed anew. That road replaces the solution rather than stepping
+  // from it, and factors every system.
+  const SparseRoad road =
+      settings_.useGaussNewton && settings_.usePardiso ? SparseRoad::kPardiso : SparseRoad::kDss;
+  const bool keep = settings_.useGaussNewton && reuseFactor_;
+  if (keep && sparse_ == nullptr) sparse_ = std::make_unique<SparseSession>(road);
+  std::unique_ptr<SparseSession> local = keep ? nullptr : std::make_unique<SparseSession>(road);
+  SparseSession& sparse = keep ? *sparse_ : *local;
   for (std::int32_t iteration = 0; iteration < settings_.iterationCount; ++iteration) {
     start = Clock::now();
+    const SolveProfile before = profile_;
     iterationBuilder_.Clear();
     std::fill(iterationRhs_.begin(), iterationRhs_.end(), 0.0);
     AddIterationTerms(iteration);
@@ -337,25 +380,23 @@ void IterativeWarpSolver::Solve() {
     }
     const CompressedMatrix system =
         CompressedMatrix::Sum(*constantMatrix_, CompressedMatrix(iterationBuilder_));
-    SparseSolveStats stats;
     bool solved;
     if (!settings_.useGaussNewton) {
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r];
       }
-      solved = sparse.Solve(system, rhs, step, order_, &stats);
+      solved = SolveSystem(sparse, false, system, rhs, step);
       if (solved) solution_ = step;
     } else {
       constantMatrix_->MultiplySymmetric(solution_, rhs);
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r] - rhs[r];
       }
-      solved = sparse.Solve(system, rhs, step, order_, &stats);
+      solved = SolveSystem(sparse, keep && sparse.HasFactor(), system, rhs, step);
       if (solved) {
         for (std::int32_t r = 0; r < unknownCount_; ++r) solution_[r] += step[r];
       }
     }
-    AddStats(profile_, stats);
     if (!solved) {
       succeeded_ = false;
       return;
@@ -363,8 +404,10 @@ void IterativeWarpSolver::Solve() {
     ++iterationsRun_;
     ++profile_.iterations;
     const double measure = ConvergenceMeasure();
-    profile_.assemblySeconds +=
-        SecondsSince(start) - stats.analyseSeconds - stats.factorSeconds - stats.solveSeconds;
+    profile_.assemblySeconds += SecondsSince(start) -
+                                (profile_.analyseSeconds - before.analyseSeconds) -
+                                (profile_.factorSeconds - before.factorSeconds) -
+                                (profile_.solveSeconds - before.solveSeconds);
     if (measure >= 0.0 && measure < settings_.convergedMeasure) break;
   }
 }

@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <functional>
 #include <memory>
+#include <span>
 #include <vector>
 
 #include "lens/sphere/PhotoToSphere.h"
@@ -11,6 +12,7 @@
 #include "solver/sparse/CompressedMatrix.h"
 #include "solver/sparse/EliminationOrder.h"
 #include "solver/sparse/SparseBuilder.h"
+#include "solver/sparse/SparseSolve.h"
 #include "solver/warp/ClosedFormWarp.h"
 #include "solver/warp/SphereWarp.h"
 
@@ -39,16 +41,18 @@ struct IterativeWarpSettings {
 // Where the time of the solves went, summed until cleared; for benchmarks
 // and diagnostics. Seconds of wall-clock time.
 struct SolveProfile {
-  double constantSeconds = 0.0;  // assembling the constant part (construction, Reset)
-  double prepareSeconds = 0.0;   // the Gauss-Newton preparation of each Solve
-  double assemblySeconds = 0.0;  // iteration terms, A0 + M, the right side, convergence
-  double analyseSeconds = 0.0;   // ordering and symbolic analysis
-  double factorSeconds = 0.0;    // numeric factorisation
-  double solveSeconds = 0.0;     // triangular solves
-  std::int32_t iterations = 0;   // systems solved
-  std::size_t peakBytes = 0;     // the sparse library's largest peak of one solve
-  double factorNonzeros = 0.0;   // of the last factor
-  double factorFlops = 0.0;      // of the last factorisation
+  double constantSeconds = 0.0;     // assembling the constant part (construction, Reset)
+  double prepareSeconds = 0.0;      // the Gauss-Newton preparation of each Solve
+  double assemblySeconds = 0.0;     // iteration terms, A0 + M, the right side, convergence
+  double analyseSeconds = 0.0;      // ordering and symbolic analysis
+  double factorSeconds = 0.0;       // numeric factorisation
+  double solveSeconds = 0.0;        // triangular solves
+  std::int32_t iterations = 0;      // systems solved
+  std::size_t peakBytes = 0;        // the sparse library's largest peak of one solve
+  double factorNonzeros = 0.0;      // of the last factor
+  double factorFlops = 0.0;         // of the last factorisation
+  std::int32_t factorizations = 0;  // numeric factorisations, failed ones included
+  std::int32_t gradientSteps = 0;   // conjugate-gradient steps on a kept factor
 };
 
 // The warp as the minimum of a quadratic energy over the (u, v) of every
@@ -57,9 +61,15 @@ struct SolveProfile {
 // a subclass adds the iteration part afresh each iteration, and each
 // iteration solves one sparse symmetric positive-definite system.
 //
-// Owns its two builders, the compressed constant part, the solution and the
-// cached elimination order; shares the grid and the image model with the
-// Solver, and owns the regulariser it builds from the model value.
+// On the Gauss-Newton road the systems of successive iterations, and of
+// successive solves after small edits, differ little: the last factor is
+// kept and each system is first tried by conjugate gradients preconditioned
+// with it, and factored afresh only when that does not converge quickly.
+//
+// Owns its two builders, the compressed constant part, the solution, the
+// cached elimination order and the sparse session with its kept factor;
+// shares the grid and the image model with the Solver, and owns the
+// regulariser it builds from the model value.
 class IterativeWarpSolver : public SphereWarp {
  public:
   IterativeWarpSolver(std::shared_ptr<const OctaMap> octaMap,
@@ -102,6 +112,11 @@ class IterativeWarpSolver : public SphereWarp {
   std::int32_t IterationsRun() const { return iterationsRun_; }
   const SolveProfile& Profile() const { return profile_; }
   void ClearProfile() { profile_ = SolveProfile{}; }
+  // Whether the Gauss-Newton road solves on a kept factor (the default), or
+  // factors every system afresh; for comparing the two. Turning it off
+  // forgets the factor.
+  void SetFactorReuse(bool reuse);
+  bool FactorReuse() const { return reuseFactor_; }
 
  protected:
   // The constant part, assembled when first needed (a solve, the accessors):
@@ -128,6 +143,10 @@ class IterativeWarpSolver : public SphereWarp {
 
   // Resizes the system to unknowns, keeping what it holds.
   void ResizeUnknowns(std::int32_t unknowns);
+  // Solves one system, first on the session's kept factor when asked, then
+  // by a fresh factorisation; counts both in the profile.
+  bool SolveSystem(SparseSession& sparse, bool tryKeptFactor, const CompressedMatrix& system,
+                   std::span<const double> rhs, std::span<double> answer);
   // Whether the vertex is on the half of a folded border without unknowns.
   bool IsFoldedHalf(std::int32_t i, std::int32_t j) const;
 
@@ -169,6 +188,10 @@ class IterativeWarpSolver : public SphereWarp {
   // asks of the vertices on its way: once each, not once per walk.
   mutable std::vector<std::atomic<std::uint8_t>> pictureState_;
   bool constantAssembled_ = false;
+  bool reuseFactor_ = true;
+  // The Gauss-Newton road's session while factors are kept: its last factor
+  // outlives the Solve that made it. Null until the first such solve.
+  std::unique_ptr<SparseSession> sparse_;
 };
 
 }  // namespace Project

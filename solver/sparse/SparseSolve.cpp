@@ -4,7 +4,9 @@
 
 #include <algorithm>
 #include <chrono>
+#include <cmath>
 #include <cstdint>
+#include <numeric>
 #include <vector>
 
 namespace Project {
@@ -28,6 +30,23 @@ bool IsPermutation(const std::vector<std::int32_t>& order) {
   return true;
 }
 
+double Dot(std::span<const double> a, std::span<const double> b) {
+  return std::inner_product(a.begin(), a.end(), b.begin(), 0.0);
+}
+
+// A dense column the library reads in place.
+cholmod_dense DenseView(std::span<const double> values) {
+  cholmod_dense view{};
+  view.nrow = values.size();
+  view.ncol = 1;
+  view.nzmax = values.size();
+  view.d = values.size();
+  view.x = const_cast<double*>(values.data());
+  view.xtype = CHOLMOD_REAL;
+  view.dtype = CHOLMOD_DOUBLE;
+  return view;
+}
+
 }  // namespace
 
 // The library's common block for the session's life, and the last factor
@@ -41,10 +60,21 @@ struct SparseSession::State {
   std::vector<int> columnStart;
   std::vector<int> rowIndex;
   std::vector<int> given;  // empty when the library ordered by itself
+  // The values the factor in hand was made of, to tell how far a later
+  // matrix of the same pattern lies from it.
+  std::vector<double> factoredValues;
+  // The preconditioner's answer and the library's workspace for it, kept
+  // between the steps of SolvePreconditioned.
+  cholmod_dense* applied = nullptr;
+  cholmod_dense* workY = nullptr;
+  cholmod_dense* workE = nullptr;
 
   explicit State(SparseRoad r) : road(r) { cholmod_start(&common); }
   ~State() {
     DropFactor();
+    cholmod_free_dense(&applied, &common);
+    cholmod_free_dense(&workY, &common);
+    cholmod_free_dense(&workE, &common);
     cholmod_finish(&common);
   }
   State(const State&) = delete;
@@ -52,6 +82,38 @@ struct SparseSession::State {
 
   void DropFactor() {
     if (factor != nullptr) cholmod_free_factor(&factor, &common);
+  }
+
+  // Whether the matrix has the factor's pattern and its values lie within
+  // `change` of the factor's, relative to the largest of them.
+  bool IsNear(const CompressedMatrix& matrix, double change) const {
+    const std::size_t entries = factoredValues.size();
+    if (static_cast<std::size_t>(matrix.FilledEntries()) != entries ||
+        columnStart.size() != static_cast<std::size_t>(matrix.Rows()) + 1) {
+      return false;
+    }
+    for (std::size_t r = 0; r < columnStart.size(); ++r) {
+      if (matrix.RowStart()[r] - 1 != columnStart[r]) return false;
+    }
+    double largest = 0.0, moved = 0.0;
+    for (std::size_t k = 0; k < entries; ++k) {
+      if (matrix.Column()[k] - 1 != rowIndex[k]) return false;
+      largest = std::max(largest, std::fabs(factoredValues[k]));
+      moved = std::max(moved, std::fabs(matrix.Value()[k] - factoredValues[k]));
+    }
+    return moved <= change * largest;
+  }
+
+  // out = (L L^T)^-1 in, with the factor in hand.
+  bool ApplyFactor(std::span<const double> in, std::span<double> out) {
+    cholmod_dense b = DenseView(in);
+    if (cholmod_solve2(CHOLMOD_A, factor, &b, nullptr, &applied, nullptr, &workY, &workE,
+                       &common) == 0) {
+      return false;
+    }
+    const double* values = static_cast<const double*>(applied->x);
+    std::copy(values, values + out.size(), out.begin());
+    return true;
   }
 
   // What tells the two roads apart: which orderings the library may choose
@@ -174,6 +236,7 @@ bool SparseSession::Solve(const CompressedMatrix& matrix, std::span<const double
     state.DropFactor();
     return false;
   }
+  state.factoredValues.assign(matrix.Value(), matrix.Value() + entries);
 
   stageStart = std::chrono::steady_clock::now();
   cholmod_dense* x = cholmod_solve(CHOLMOD_A, factor, &b, &common);
@@ -186,6 +249,62 @@ bool SparseSession::Solve(const CompressedMatrix& matrix, std::span<const double
   std::copy(values, values + n, solution.begin());
   cholmod_free_dense(&x, &common);
   return common.status == CHOLMOD_OK;
+}
+
+bool SparseSession::HasFactor() const { return state_->factor != nullptr; }
+
+void SparseSession::DropFactor() { state_->DropFactor(); }
+
+bool SparseSession::SolvePreconditioned(const CompressedMatrix& matrix, std::span<const double> rhs,
+                                        std::span<double> solution,
+                                        const PreconditionedLimits& limits,
+                                        SparseSolveStats* stats) {
+  State& state = *state_;
+  const auto start = std::chrono::steady_clock::now();
+  const std::size_t size = rhs.size();
+  if (state.factor == nullptr || state.factor->n != size || !matrix.IsComplete() ||
+      static_cast<std::size_t>(matrix.Rows()) != size || solution.size() != size ||
+      !state.IsNear(matrix, limits.maxChange)) {
+    return false;
+  }
+  std::vector<double> residual(rhs.begin(), rhs.end()), direction(size), product(size),
+      preconditioned(size);
+  std::fill(solution.begin(), solution.end(), 0.0);
+  const double target = limits.tolerance * std::sqrt(Dot(rhs, rhs));
+  bool converged = target == 0.0;
+  std::int32_t steps = 0;
+  if (!converged && state.ApplyFactor(residual, preconditioned)) {
+    direction = preconditioned;
+    double rz = Dot(residual, preconditioned);
+    while (steps < limits.maxSteps) {
+      ++steps;
+      matrix.MultiplySymmetric(direction, product);
+      const double curvature = Dot(direction, product);
+      // Not positive definite, or not a number: no step to take.
+      if (!(curvature > 0.0)) break;
+      const double alpha = rz / curvature;
+      for (std::size_t k = 0; k < size; ++k) {
+        solution[k] += alpha * direction[k];
+        residual[k] -= alpha * product[k];
+      }
+      if (std::sqrt(Dot(residual, residual)) <= target) {
+        converged = true;
+        break;
+      }
+      if (!state.ApplyFactor(residual, preconditioned)) break;
+      const double next = Dot(residual, preconditioned);
+      const double beta = next / rz;
+      rz = next;
+      for (std::size_t k = 0; k < size; ++k) {
+        direction[k] = preconditioned[k] + beta * direction[k];
+      }
+    }
+  }
+  if (stats != nullptr) {
+    stats->gradientSteps = steps;
+    stats->solveSeconds = SecondsSince(start);
+  }
+  return converged;
 }
 
 bool SolveWithDss(const CompressedMatrix& matrix, std::span<const double> rhs,

@@ -19,6 +19,19 @@ struct SparseSolveStats {
   double analyseSeconds = 0.0;
   double factorSeconds = 0.0;
   double solveSeconds = 0.0;
+  // Conjugate-gradient steps of SolvePreconditioned, whether or not they
+  // converged; 0 for a direct solve.
+  std::int32_t gradientSteps = 0;
+};
+
+// When SolvePreconditioned takes a matrix on: when it has the kept factor's
+// pattern and no entry has moved by more than `maxChange` times the largest
+// of the factor's. When it stops: once the residual is at most `tolerance`
+// times the right side's (Euclidean norms), or gives up after `maxSteps`.
+struct PreconditionedLimits {
+  double maxChange = 1e-6;
+  double tolerance = 1e-8;
+  std::int32_t maxSteps = 4;
 };
 
 // Solves A x = rhs for a symmetric positive-definite A given by its upper
@@ -53,7 +66,12 @@ enum class SparseRoad { kDss, kPardiso };
 // functions above, which start afresh every time: the order they would
 // compute again is the one already in hand. A pattern or an order that
 // differs from the last one, or a failed factorisation, analyses anew.
-// Owns the library's state; released with the session.
+//
+// The last good factor also stays in hand for SolvePreconditioned, which
+// solves a matrix of the same pattern and nearly the same values by
+// conjugate gradients with that factor as the preconditioner: a few
+// triangular solves instead of a factorisation.
+// Owns the library's state and the factor; released with the session.
 class SparseSession {
  public:
   explicit SparseSession(SparseRoad road);
@@ -67,6 +85,21 @@ class SparseSession {
              SparseSolveStats* stats = nullptr);
   // Whether the last Solve reused the analysis of the one before.
   bool Reused() const { return reused_; }
+
+  // Solves matrix x = rhs, the matrix given as for Solve, by conjugate
+  // gradients from x = 0 preconditioned with the factor of the last good
+  // Solve. Answers false when there is no factor, the matrix is not near the
+  // factor's (see the limits), it shows a direction of non-positive
+  // curvature, or the residual has not fallen within the limits; `solution`
+  // is then unspecified and the caller factors afresh. Keeps the factor
+  // either way.
+  bool SolvePreconditioned(const CompressedMatrix& matrix, std::span<const double> rhs,
+                           std::span<double> solution, const PreconditionedLimits& limits,
+                           SparseSolveStats* stats = nullptr);
+  // Whether a factor is in hand, and forgetting it (the pattern's analysis
+  // goes with it).
+  bool HasFactor() const;
+  void DropFactor();
 
  private:
   struct State;

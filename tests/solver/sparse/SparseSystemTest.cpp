@@ -170,9 +170,10 @@ TEST(CompressedMatrix, SumAndSymmetricProductMatchDenseArithmetic) {
 // other BLAS builds while a dropped entry or a wrong order misses by far more.
 constexpr double kSolveTolerance = 1e-9;
 
-void ExpectSolves(const std::vector<double>& x, const TestSystem& s) {
+void ExpectSolves(const std::vector<double>& x, const TestSystem& s,
+                  double tolerance = kSolveTolerance) {
   const std::vector<double> expected = DenseSolve(s);
-  for (int i = 0; i < s.n; ++i) EXPECT_NEAR(x[i], expected[i], kSolveTolerance) << i;
+  for (int i = 0; i < s.n; ++i) EXPECT_NEAR(x[i], expected[i], tolerance) << i;
 }
 
 using SolveFunction = bool (*)(const CompressedMatrix&, std::span<const double>, std::span<double>,
@@ -312,6 +313,60 @@ TEST(SparseSession, KeepsItsAnalysisWhileThePatternHolds) {
     EXPECT_FALSE(session.Reused());
     ExpectSolves(x, again);
   }
+}
+
+// A kept factor solves the matrix it was made of and one whose entries
+// moved by less than the limit, to the dense answer, also when the matrix
+// is nearly singular; it refuses a matrix moved further or of another
+// pattern, and there is none after a failed factorisation.
+TEST(SparseSession, SolvesANearbyMatrixOnItsKeptFactor) {
+  SparseSession session(SparseRoad::kPardiso);
+  EliminationOrder order;
+  std::vector<double> x(60);
+  const PreconditionedLimits limits;
+  TestSystem s = LeastSquaresSystem(60, 23);
+  EXPECT_FALSE(session.SolvePreconditioned(CompressedMatrix(s.builder), s.rhs, x, limits));
+  ASSERT_TRUE(session.Solve(CompressedMatrix(s.builder), s.rhs, x, order));
+  SparseSolveStats stats;
+  ASSERT_TRUE(session.SolvePreconditioned(CompressedMatrix(s.builder), s.rhs, x, limits, &stats));
+  EXPECT_LE(stats.gradientSteps, 1);  // the factor is the matrix's own
+  ExpectSolves(x, s);
+  for (int i = 0; i < s.n; i += 7) s.Add(i, i, 1e-7);  // within the default limit
+  ASSERT_TRUE(session.SolvePreconditioned(CompressedMatrix(s.builder), s.rhs, x, limits));
+  ExpectSolves(x, s);
+  s.Add(3, 3, 1e-3);
+  EXPECT_FALSE(session.SolvePreconditioned(CompressedMatrix(s.builder), s.rhs, x, limits));
+  const TestSystem other = LeastSquaresSystem(60, 24);
+  EXPECT_FALSE(session.SolvePreconditioned(CompressedMatrix(other.builder), other.rhs, x, limits));
+
+  // Rows that leave a direction almost free, as the mesh's few weak anchors
+  // do: u0 - u1 is held only by the diagonal's 1e-9, so A's condition is
+  // near 1e10 and the answer large along that direction.
+  TestSystem weak(40);
+  for (int i = 0; i + 1 < weak.n; ++i) {
+    weak.Add(i, i, 1.0);
+    weak.Add(i + 1, i + 1, 1.0);
+    weak.Add(i, i + 1, -1.0);
+    weak.rhs[i] = std::sin(i);
+  }
+  for (int i = 0; i < weak.n; ++i) weak.Add(i, i, 1e-9);
+  weak.rhs[weak.n - 1] = -[&] {
+    double sum = 0.0;
+    for (int i = 0; i + 1 < weak.n; ++i) sum += weak.rhs[i];
+    return sum;
+  }();  // the right side lies off the free direction
+  x.assign(weak.n, 0.0);
+  ASSERT_TRUE(session.Solve(CompressedMatrix(weak.builder), weak.rhs, x, order));
+  for (int i = 0; i < weak.n; i += 5) weak.Add(i, i, 1e-8);
+  ASSERT_TRUE(session.SolvePreconditioned(CompressedMatrix(weak.builder), weak.rhs, x, limits));
+  // Rounding of order 1e-16 grows by the condition along the free
+  // direction: 1e-6 of answers some 100 across.
+  ExpectSolves(x, weak, 1e-4);
+
+  weak.Add(0, 0, -10.0);
+  EXPECT_FALSE(session.Solve(CompressedMatrix(weak.builder), weak.rhs, x, order));
+  EXPECT_FALSE(session.HasFactor());
+  EXPECT_FALSE(session.SolvePreconditioned(CompressedMatrix(weak.builder), weak.rhs, x, limits));
 }
 
 }  // namespace
