@@ -62,6 +62,7 @@ std::unique_ptr<HostDocument> HostDocument::Duplicate() const {
   }
   copy->SetResolution(resolutionX_, resolutionY_);
   copy->SetSource(sourcePath_, sourceFormat_);
+  copy->SetColourProfile(colourProfile_);
   return copy;
 }
 

@@ -80,6 +80,11 @@ class HostDocument {
   FileFormat SourceFormat() const { return sourceFormat_; }
   void SetSource(std::string path, FileFormat format);
 
+  // The ICC profile the file embeds, as its bytes; empty when it has none.
+  // Kept as read, for the display conversion and for writing back.
+  const std::vector<uint8_t>& ColourProfile() const { return colourProfile_; }
+  void SetColourProfile(std::vector<uint8_t> profile) { colourProfile_ = std::move(profile); }
+
  private:
   HostDocument(int32_t width, int32_t height, ImageMode mode, bool hasTransparency);
   void CheckPlane(int plane, int depth) const;
@@ -92,6 +97,7 @@ class HostDocument {
   double resolutionY_ = 72.0;
   std::string sourcePath_;
   FileFormat sourceFormat_ = FileFormat::kNone;
+  std::vector<uint8_t> colourProfile_;
   std::vector<std::unique_ptr<uint8_t[]>> planes8_;
   std::vector<std::unique_ptr<uint16_t[]>> planes16_;
 };

@@ -13,6 +13,7 @@
 #include <cerrno>
 #include <cmath>
 #include <csetjmp>
+#include <cstdlib>
 #include <cstring>
 #include <limits>
 #include <vector>
@@ -61,6 +62,8 @@ struct JpegReadJob {
   J_COLOR_SPACE fileSpace;
   JSAMPROW row;
   HostDocument* target;
+  JOCTET* profile;  // libjpeg's malloc, freed with the job
+  unsigned profileBytes;
 };
 
 struct JpegWriteJob {
@@ -108,7 +111,15 @@ bool ReadJpegHeader(JpegReadJob* job) {
   job->jpeg.mem->max_memory_to_use = static_cast<long>(
       std::min<uint64_t>(HostDocument::MemoryLimit(), std::numeric_limits<long>::max()));
   jpeg_stdio_src(&job->jpeg, job->file);
+  // An embedded colour profile comes in APP2 markers, which libjpeg drops
+  // unless asked to keep them.
+  jpeg_save_markers(&job->jpeg, JPEG_APP0 + 2, 0xFFFF);
   jpeg_read_header(&job->jpeg, TRUE);
+  // Only now: the saved markers are gone once decompression is finished.
+  // A damaged profile is a warning, and the image is read without it.
+  if (!jpeg_read_icc_profile(&job->jpeg, &job->profile, &job->profileBytes)) {
+    job->profile = nullptr;
+  }
   job->adobe = job->jpeg.saw_Adobe_marker;
   job->fileSpace = job->jpeg.jpeg_color_space;
   switch (job->fileSpace) {
@@ -182,6 +193,10 @@ bool WriteJpegRows(JpegWriteJob* job) {
   job->jpeg.Y_density =
       static_cast<UINT16>(std::clamp(std::lround(source.ResolutionY()), 1L, 65535L));
   jpeg_start_compress(&job->jpeg, TRUE);
+  const std::vector<uint8_t>& profile = source.ColourProfile();
+  if (!profile.empty()) {
+    jpeg_write_icc_profile(&job->jpeg, profile.data(), static_cast<unsigned>(profile.size()));
+  }
   // The host's CMYK counts paper, as Adobe-marked files do: no change.
   const std::array<SampleCoding, 4> direct{};
   while (job->jpeg.next_scanline < job->jpeg.image_height) {
@@ -214,6 +229,7 @@ std::unique_ptr<HostDocument> JpegFile::Read(const std::string& path) {
     ~Owner() {
       if (job.created) jpeg_destroy_decompress(&job.jpeg);
       if (job.file != nullptr) std::fclose(job.file);
+      std::free(job.profile);
     }
   } owner{job};
   job.file = std::fopen(path.c_str(), "rb");
@@ -254,6 +270,9 @@ std::unique_ptr<HostDocument> JpegFile::Read(const std::string& path) {
   if (job.jpeg.saw_JFIF_marker) {
     document->SetResolution(DotsPerInch(job.jpeg.density_unit, job.jpeg.X_density),
                             DotsPerInch(job.jpeg.density_unit, job.jpeg.Y_density));
+  }
+  if (job.profile != nullptr) {
+    document->SetColourProfile(std::vector<uint8_t>(job.profile, job.profile + job.profileBytes));
   }
   document->SetSource(path, FileFormat::kJpeg);
   return document;

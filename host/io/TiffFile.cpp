@@ -367,6 +367,11 @@ std::unique_ptr<HostDocument> TiffFile::Read(const std::string& path) {
   TIFFGetFieldDefaulted(tiff.get(), TIFFTAG_RESOLUTIONUNIT, &unit);
   document->SetResolution(ResolutionOf(tiff.get(), TIFFTAG_XRESOLUTION, unit),
                           ResolutionOf(tiff.get(), TIFFTAG_YRESOLUTION, unit));
+  uint32_t profileBytes = 0;
+  const uint8_t* profile = nullptr;
+  if (TIFFGetField(tiff.get(), TIFFTAG_ICCPROFILE, &profileBytes, &profile) && profile != nullptr) {
+    document->SetColourProfile(std::vector<uint8_t>(profile, profile + profileBytes));
+  }
   document->SetSource(path, FileFormat::kTiff);
   return document;
 }
@@ -398,6 +403,10 @@ void TiffFile::Write(const HostDocument& document, const std::string& path,
             TIFFSetField(t, TIFFTAG_RESOLUTIONUNIT, RESUNIT_INCH);
   if (ok && document.Model() == ColourModel::kCmyk) {
     ok = TIFFSetField(t, TIFFTAG_INKSET, INKSET_CMYK);
+  }
+  const std::vector<uint8_t>& profile = document.ColourProfile();
+  if (ok && !profile.empty()) {
+    ok = TIFFSetField(t, TIFFTAG_ICCPROFILE, static_cast<uint32_t>(profile.size()), profile.data());
   }
   if (ok && document.HasTransparency()) {
     const uint16_t extra[] = {EXTRASAMPLE_UNASSALPHA};
