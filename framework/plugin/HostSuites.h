@@ -303,6 +303,38 @@ struct HostDescriptorSuite {
   HostStatus (*getData)(HostDescriptor descriptor, std::uint32_t key, void* bytes);  // 45
 };
 
+// The display colour suite: the host turns samples of a document's mode into
+// colours for the screen, in sRGB so that the answer does not depend on the
+// monitor. The module finds it like any suite, through the record's
+// suiteAccess by name and version, and works without it (see
+// CDisplayConversion).
+constexpr const char kDisplayColourSuite[] = "Quillmark Display Colour Suite for Plug-ins";
+constexpr std::int32_t kDisplayColourSuiteVersion = 1;
+// The largest block, in either direction, that one call converts.
+constexpr std::int32_t kDisplayBlockSide = 512;
+
+// 8-bit samples in memory, one address per plane: sample (x, y) of plane k
+// lies at planes[k] + y * rowBytes + x * columnBytes. Strides rather than a
+// fixed layout, so each side passes as it lies: the module's tiles are
+// planar (a buffer per plane, columnBytes 1) and its screen surfaces
+// interleaved (columnBytes 4), and neither is repacked on the way.
+struct HostSampleBlock {
+  std::uint8_t* planes[4];
+  std::int32_t rowBytes;
+  std::int32_t columnBytes;
+};
+
+struct HostDisplayColourSuite {
+  // Converts width x height pixels (each side 1 to kDisplayBlockSide) of
+  // source's colour planes, in imageMode's order, into 8-bit sRGB in
+  // destination's planes 0, 1 and 2. Samples are 8-bit whatever the mode's
+  // depth: a 16-bit mode stands for its 8-bit twin. Only colour planes are
+  // named; a transparency plane stays with the caller. 0 is success; any
+  // other answer leaves the destination undefined.
+  HostStatus (*convertToDisplay)(std::int16_t imageMode, std::int32_t width, std::int32_t height,
+                                 const HostSampleBlock* source, const HostSampleBlock* destination);
+};
+
 // The exported entry of a filter module.
 using HostEntryProc = void (*)(std::int16_t selector, HostFilterRecord* record,
                                std::intptr_t* dataSlot, std::int16_t* result);

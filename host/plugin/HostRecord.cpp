@@ -7,6 +7,7 @@
 #include "host/platform/SystemInfo.h"
 #include "host/plugin/BlockExchange.h"
 #include "host/plugin/DescriptorSuite.h"
+#include "host/plugin/DisplayColour.h"
 #include "host/plugin/DocumentChannels.h"
 #include "host/plugin/HostBuffers.h"
 #include "host/plugin/HostCodes.h"
@@ -74,7 +75,8 @@ HostRecord::HostRecord(HostDocument& document, Settings settings, RunObserver& o
       platform_(std::make_unique<void*[]>(4)),
       channels_(std::make_unique<DocumentChannels>(document)),
       blocks_(std::make_unique<BlockExchange>(document, *record_)),
-      properties_(std::make_unique<HostProperties>(std::move(settings.properties))) {
+      properties_(std::make_unique<HostProperties>(std::move(settings.properties))),
+      display_(std::make_unique<DisplayColour>(document.ColourProfile())) {
   properties_->SetDocumentPath(document.SourcePath());
   blocks_->SetBeforeFirstWrite([this, &document] {
     original_ = document.Duplicate();
@@ -155,6 +157,8 @@ uint32_t HostRecord::DefaultMemoryOffer() {
   if (half == 0) return 256u << 20;
   return static_cast<uint32_t>(std::min<uint64_t>(half, 2ull << 30));
 }
+
+HostRecord* HostRecord::Active() { return active; }
 
 HostRecord::Scope::Scope(HostRecord& record) : previous_(active) { active = &record; }
 

@@ -13,6 +13,7 @@
 namespace Host {
 
 class BlockExchange;
+class DisplayColour;
 class DocumentChannels;
 
 // The record served to the filter for one document, and everything hanging
@@ -47,6 +48,10 @@ class HostRecord {
   Tarsa::HostFilterRecord* Record() { return record_.get(); }
   BlockExchange& Blocks() { return *blocks_; }
   HostProperties& Properties() { return *properties_; }
+  // The document's display conversion, served as the display colour suite.
+  DisplayColour& Display() { return *display_; }
+  // The record whose selector is running (inside a Scope), or null.
+  static HostRecord* Active();
 
   // Puts a descriptor for the filter to read into the script block.
   void SetDescriptor(const Descriptor& descriptor);
@@ -86,6 +91,7 @@ class HostRecord {
   std::unique_ptr<DocumentChannels> channels_;
   std::unique_ptr<BlockExchange> blocks_;
   std::unique_ptr<HostProperties> properties_;
+  std::unique_ptr<DisplayColour> display_;
   Tarsa::HostHandle descriptorIn_ = nullptr;
 };
 

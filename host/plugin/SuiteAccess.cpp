@@ -3,6 +3,7 @@
 #include <cstring>
 
 #include "host/plugin/DescriptorSuite.h"
+#include "host/plugin/DisplayColour.h"
 #include "host/plugin/DocumentChannels.h"
 #include "host/plugin/HostBuffers.h"
 #include "host/plugin/HostCodes.h"
@@ -56,6 +57,7 @@ const void* Buffers() { return HostBuffers::Suite(); }
 const void* Ports() { return DocumentChannels::PortsSuite(); }
 const void* Descriptors() { return DescriptorSuite::Table(); }
 const void* LensProfiles() { return LensProfileService::Suite(); }
+const void* DisplayColours() { return DisplayColour::Suite(); }
 
 constexpr Served kServed[] = {
     {Tarsa::kChannelPortsSuite, 3, 3, Ports},
@@ -71,6 +73,8 @@ constexpr Served kServed[] = {
     {Tarsa::kLookoutSuite, 1, 1, Lookout},
     {Tarsa::kDescriptorSuite, 5, 5, Descriptors},
     {Tarsa::kLensProfilesSuite, 2, 2, LensProfiles},
+    {Tarsa::kDisplayColourSuite, Tarsa::kDisplayColourSuiteVersion,
+     Tarsa::kDisplayColourSuiteVersion, DisplayColours},
 };
 
 Tarsa::HostStatus Acquire(const char* name, int32_t version, const void** suite) {
