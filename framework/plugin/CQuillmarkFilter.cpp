@@ -13,6 +13,7 @@
 #include "framework/native/NativeSystem.h"
 #include "framework/pixels/SampleInterleave.h"
 #include "framework/plugin/CBufferSuiteAllocator.h"
+#include "framework/plugin/CDisplayConversion.h"
 #include "framework/plugin/CQuillmarkError.h"
 #include "framework/strings/Unicode.h"
 
@@ -645,6 +646,22 @@ void CQuillmarkFilter::WritePixmap(const CMemoryPixmap& pixmap, const CRect& rec
   }
   ClearRequests();
   Advance();
+}
+
+void CQuillmarkFilter::ConvertToDisplay(std::int32_t mode, const CBasicPixmap& source,
+                                        const CRect& area, CBasicPixmap& destination, CPoint to) {
+  // Acquired for the one call: the suite is cheap to find, and a call made
+  // while no record is at hand simply takes the module's own formulas.
+  const auto* suite = static_cast<const HostDisplayColourSuite*>(
+      AcquireSuite(kDisplayColourSuite, kDisplayColourSuiteVersion));
+  struct Release {
+    CQuillmarkFilter* filter;
+    bool held;
+    ~Release() {
+      if (held) filter->ReleaseSuite(kDisplayColourSuite, kDisplayColourSuiteVersion);
+    }
+  } release{this, suite != nullptr};
+  CDisplayConversion(suite).Convert(mode, source, area, destination, to);
 }
 
 }  // namespace Tarsa

@@ -116,6 +116,14 @@ class CQuillmarkFilter : public CQuillmarkPlugin {
   // the host. The host's cancel is a silent CAbort, another failure a
   // CSystemError with its code.
   void WritePixmap(const CMemoryPixmap& pixmap, const CRect& rect, std::int32_t planeCount);
+  // Turns area of source's colour planes, 8-bit samples in mode (a 16-bit
+  // mode stands for its 8-bit twin), into 8-bit sRGB in destination's planes
+  // 0, 1 and 2, area's top left going to `to`: through the host's display
+  // colour suite, in blocks of at most 512 x 512, else by the module's own
+  // formulas (CDisplayConversion). Transparency stays with the caller.
+  // CError unless both pixmaps are 8-bit and cover their areas.
+  void ConvertToDisplay(std::int32_t mode, const CBasicPixmap& source, const CRect& area,
+                        CBasicPixmap& destination, CPoint to);
 
  protected:
   static constexpr std::uint32_t kFlag_Interactive = 1u << 0;
