@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
+#include <new>
 #include <utility>
 
 #include "host/plugin/HostCodes.h"
@@ -50,9 +51,13 @@ Tarsa::HostStatus ConvertForActiveRecord(int16_t mode, int32_t width, int32_t he
   }
   HostRecord* record = HostRecord::Active();
   if (record == nullptr) return HostCodes::kParamErr;
-  return record->Display().Convert(mode, width, height, *source, *destination)
-             ? HostCodes::kNoError
-             : HostCodes::kNotAvailable;
+  try {
+    return record->Display().Convert(mode, width, height, *source, *destination)
+               ? HostCodes::kNoError
+               : HostCodes::kNotAvailable;
+  } catch (const std::bad_alloc&) {  // nothing may leave a C entry
+    return HostCodes::kMemFullErr;
+  }
 }
 
 constexpr Tarsa::HostDisplayColourSuite kSuite = {ConvertForActiveRecord};
@@ -148,7 +153,7 @@ DisplayColour::CmykProfile DisplayColour::CmykProfileInUse() {
 bool DisplayColour::Convert(int16_t mode, int32_t width, int32_t height,
                             const Tarsa::HostSampleBlock& source,
                             const Tarsa::HostSampleBlock& destination) {
-  if (!IsImageMode(mode)) return false;
+  if (!IsImageMode(mode) || width < 0 || height < 0) return false;
   const ColourModel model = ColourModelOf(static_cast<ImageMode>(mode));
   const int channels = ColourPlanesOf(model);
   if (!HasPlanes(source, channels) || !HasPlanes(destination, 3)) return false;
