@@ -14,6 +14,8 @@
 
 #include "host/plugin/DisplayColour.h"
 #include "host/plugin/HostCodes.h"
+#include "host/plugin/HostRecord.h"
+#include "host/plugin/RunObserver.h"
 
 namespace Host {
 namespace {
@@ -276,6 +278,33 @@ TEST(DisplayColourTest, TheSuiteHoldsCallersToItsBlocksAndNeedsARecord) {
   EXPECT_EQ(suite->convertToDisplay(mode, 1, 1, nullptr, &block), HostCodes::kParamErr);
   // A block of the right size, but no selector running: no document to ask.
   EXPECT_EQ(suite->convertToDisplay(mode, 512, 1, &block, &block), HostCodes::kParamErr);
+}
+
+class QuietObserver : public RunObserver {
+ public:
+  bool AbortRequested() override { return false; }
+  void Progress(int32_t, int32_t) override {}
+};
+
+TEST(DisplayColourTest, TheRecordServesTheSuiteWithItsDocumentsProfile) {
+  auto document = HostDocument::Create(1, 1, ImageMode::kCmyk);
+  document->SetColourProfile(RedInkProfile());
+  QuietObserver observer;
+  HostRecord record(*document, {}, observer);
+  HostRecord::Scope scope(record);
+  const auto* access = static_cast<const Tarsa::HostSuiteAccess*>(record.Record()->suiteAccess);
+  const void* table = nullptr;
+  ASSERT_EQ(access->acquire(Tarsa::kDisplayColourSuite, Tarsa::kDisplayColourSuiteVersion, &table),
+            0);
+  std::uint8_t cyan[4] = {0, 255, 255, 255};
+  std::uint8_t rgb[3] = {};
+  const Tarsa::HostSampleBlock source{{cyan, cyan + 1, cyan + 2, cyan + 3}, 4, 4};
+  const Tarsa::HostSampleBlock destination{{rgb, rgb + 1, rgb + 2, nullptr}, 3, 3};
+  ASSERT_EQ(static_cast<const Tarsa::HostDisplayColourSuite*>(table)->convertToDisplay(
+                int16_t(ImageMode::kCmyk), 1, 1, &source, &destination),
+            0);
+  EXPECT_GT(rgb[0], rgb[1] + 60) << "red, by the document's profile";
+  EXPECT_EQ(record.Display().CmykProfileInUse(), DisplayColour::CmykProfile::kDocument);
 }
 
 }  // namespace
