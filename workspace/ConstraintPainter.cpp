@@ -66,6 +66,10 @@ ConstraintPainter::ConstraintPainter(ConstraintList& list, const ScreenTransform
 
 void ConstraintPainter::Draw(Tarsa::CPort& port, bool bandActive) {
   OverlayCanvas canvas(&port);
+  PaintList(bandActive, canvas);
+}
+
+void ConstraintPainter::PaintList(bool bandActive, OverlayCanvas& canvas) {
   for (const auto& item : list_.Items()) Paint(*item, HighlightOf(*item), canvas);
   if (bandActive) PaintBand(canvas);
 }
@@ -76,8 +80,7 @@ ScreenBounds ConstraintPainter::Measure(bool selectedOnly, bool bandActive) {
     if (const Constraint* first = list_.FirstSelected()) Paint(*first, HighlightOf(*first), canvas);
     return canvas.Bounds();
   }
-  for (const auto& item : list_.Items()) Paint(*item, HighlightOf(*item), canvas);
-  if (bandActive) PaintBand(canvas);
+  PaintList(bandActive, canvas);
   return canvas.Bounds();
 }
 

@@ -43,6 +43,8 @@ class ConstraintPainter {
   // How the list marks the constraint: selection, hover, live rotation and
   // the dragged focal handle.
   Highlight HighlightOf(const Constraint& constraint) const;
+  // Every constraint in list order, then the band while bandActive.
+  void PaintList(bool bandActive, OverlayCanvas& canvas);
   void Paint(const Constraint& constraint, const Highlight& highlight, OverlayCanvas& canvas);
   void PaintLine(const LineConstraint& line, const Highlight& highlight, OverlayCanvas& canvas);
   void PaintGadget(const LineConstraint& line, const Highlight& highlight, std::uint32_t colour,

@@ -225,6 +225,16 @@ TEST(ConstraintPainter, TheMeasuredBoxIsTheDrawnBox) {
     check(scene, false);
   }
   {
+    SCOPED_TRACE("a tool's line, out of the list, hovered");
+    ConstraintScene scene;
+    LineConstraint pending({150, 60}, {420, 110});
+    DrawnImage image(600, 400);
+    const ScreenBounds measured =
+        ConstraintPainter(scene.list, screen).DrawOne(pending, {false, true}, &image.Port());
+    image.Read();
+    ExpectTight(measured, image);
+  }
+  {
     SCOPED_TRACE("the polygon being drawn");
     ConstraintScene scene;
     scene.AddDraftPoints({{120, 330}, {260, 370}});
