@@ -365,6 +365,7 @@ void IterativeWarpSolver::Solve() {
   if (keep && sparse_ == nullptr) sparse_ = std::make_unique<SparseSession>(road);
   std::unique_ptr<SparseSession> local = keep ? nullptr : std::make_unique<SparseSession>(road);
   SparseSession& sparse = keep ? *sparse_ : *local;
+  sparse.SetSerialLibraryLoops(serialLoops_);
   for (std::int32_t iteration = 0; iteration < settings_.iterationCount; ++iteration) {
     start = Clock::now();
     const SolveProfile before = profile_;

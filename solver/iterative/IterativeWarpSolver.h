@@ -117,6 +117,9 @@ class IterativeWarpSolver : public SphereWarp {
   // forgets the factor.
   void SetFactorReuse(bool reuse);
   bool FactorReuse() const { return reuseFactor_; }
+  // Whether the sparse library's OpenMP loops run on the solving thread
+  // alone (the default); for comparing.
+  void SetSerialLibraryLoops(bool serial) { serialLoops_ = serial; }
 
  protected:
   // The constant part, assembled when first needed (a solve, the accessors):
@@ -189,6 +192,7 @@ class IterativeWarpSolver : public SphereWarp {
   mutable std::vector<std::atomic<std::uint8_t>> pictureState_;
   bool constantAssembled_ = false;
   bool reuseFactor_ = true;
+  bool serialLoops_ = true;
   // The Gauss-Newton road's session while factors are kept: its last factor
   // outlives the Solve that made it. Null until the first such solve.
   std::unique_ptr<SparseSession> sparse_;

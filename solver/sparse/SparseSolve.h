@@ -96,6 +96,9 @@ class SparseSession {
   bool SolvePreconditioned(const CompressedMatrix& matrix, std::span<const double> rhs,
                            std::span<double> solution, const PreconditionedLimits& limits,
                            SparseSolveStats* stats = nullptr);
+  // Whether the library's own OpenMP loops run on the calling thread alone
+  // (the default), or take the threads the library asks for.
+  void SetSerialLibraryLoops(bool serial) { serialLoops_ = serial; }
   // Whether a factor is in hand, and forgetting it (the pattern's analysis
   // goes with it).
   bool HasFactor() const;
@@ -105,6 +108,7 @@ class SparseSession {
   struct State;
   std::unique_ptr<State> state_;
   bool reused_ = false;
+  bool serialLoops_ = true;
 };
 
 }  // namespace Project
