@@ -29,6 +29,7 @@
 
 #include "bench/BenchSupport.h"
 #include "solver/iterative/IterativeWarpSolver.h"
+#include "solver/iterative/LineSolve.h"
 #include "tests/support/QualityMeasures.h"
 
 namespace {
@@ -49,9 +50,13 @@ struct Variant {
   std::int32_t level = 6;
   bool gaussNewton = true;
   bool cacheOrder = false;
-  // Systems solved on the last factor where it serves (the default road),
-  // or every one factored afresh.
+  // The default road: line rows in the offset form, systems solved on the
+  // last factor where it serves, the sparse library's loops on the solving
+  // thread alone; or, part by part, the form from the first sample, every
+  // system factored afresh, the library's loops on the threads it asks for.
   bool keepFactor = true;
+  LineForm form = LineForm::kOffset;
+  bool serialLoops = true;
   // Time the edit that adds the last line to the others, solved already,
   // rather than the solve of all of them on the plain mesh.
   bool edit = false;
@@ -84,7 +89,9 @@ class Bench {
                }),
         edit_(variant.edit),
         drag_(variant.drag),
-        keepFactor_(variant.keepFactor) {
+        keepFactor_(variant.keepFactor),
+        form_(variant.form),
+        serialLoops_(variant.serialLoops) {
     lines_ = scene_.Pick(variant.lines, true);
     if (edit_ || drag_) {
       // The line added is a free one: it leaves the verticals, and so the
@@ -171,8 +178,10 @@ class Bench {
  private:
   // The solver's warp, on this bench's road.
   IterativeWarpSolver* Warp() {
-    auto* warp = dynamic_cast<IterativeWarpSolver*>(scene_.solver().GetWarp().get());
+    auto* warp = dynamic_cast<LineSolve*>(scene_.solver().GetWarp().get());
     warp->SetFactorReuse(keepFactor_);
+    warp->SetLineForm(form_);
+    warp->SetSerialLibraryLoops(serialLoops_);
     return warp;
   }
 
@@ -181,6 +190,8 @@ class Bench {
   bool edit_;
   bool drag_;
   bool keepFactor_;
+  LineForm form_;
+  bool serialLoops_;
   bool solvedBefore_ = false;
   std::int32_t drags_ = 0;
 };
@@ -251,31 +262,40 @@ void RunPair(benchmark::State& state, const Variant& variant, const Variant& bas
   state.counters[ratio] = Median(total) / Median(baseTotal);
 }
 
-// The kept-factor road beside factoring every system afresh, at mesh
-// levels 5 to 8 with 0, 10 and 40 lines, and for the interactive edits at
-// the default level: one line added, one line's end dragged.
+// The default road beside the road before it (rows from the first sample,
+// every system factored afresh, the library's loops on its own threads), at
+// mesh levels 5 to 8 with 0, 10 and 40 lines, and for the interactive edits
+// at the default level: one line added (edit 1), one line's end dragged
+// (edit 2). The fourth argument leaves one part of the default road out:
+// 1 the kept factor, 2 the serial library loops, 3 the offset form.
 void BM_Roads(benchmark::State& state) {
   Variant variant;
   variant.level = static_cast<std::int32_t>(state.range(0));
   variant.lines = static_cast<std::size_t>(state.range(1));
   variant.edit = state.range(2) == 1;
   variant.drag = state.range(2) == 2;
+  variant.keepFactor = state.range(3) != 1;
+  variant.serialLoops = state.range(3) != 2;
+  variant.form = state.range(3) == 3 ? LineForm::kFromFirstSample : LineForm::kOffset;
   Variant baseline = variant;
   baseline.keepFactor = false;
-  RunPair(state, variant, baseline, "vs_fresh_factor");
+  baseline.serialLoops = false;
+  baseline.form = LineForm::kFromFirstSample;
+  RunPair(state, variant, baseline, "vs_before");
 }
 BENCHMARK(BM_Roads)
-    ->ArgNames({"level", "lines", "edit"})
-    ->ArgsProduct({{5, 6, 7}, {0, 10, 40}, {0}})
-    ->Args({6, 10, 1})
-    ->Args({6, 10, 2})
-    ->Args({6, 40, 2})
+    ->ArgNames({"level", "lines", "edit", "road"})
+    ->ArgsProduct({{5, 6, 7}, {0, 10, 40}, {0}, {0}})
+    ->ArgsProduct({{6}, {10, 40}, {0}, {1, 2, 3}})
+    ->Args({6, 10, 1, 0})
+    ->Args({6, 10, 2, 0})
+    ->Args({6, 40, 2, 0})
     ->Iterations(5)
     ->UseManualTime()
     ->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Roads)
-    ->ArgNames({"level", "lines", "edit"})
-    ->ArgsProduct({{8}, {0, 10, 40}, {0}})
+    ->ArgNames({"level", "lines", "edit", "road"})
+    ->ArgsProduct({{8}, {0, 10, 40}, {0}, {0}})
     ->Iterations(1)
     ->UseManualTime()
     ->Unit(benchmark::kMillisecond);

@@ -164,12 +164,17 @@ void LineSolve::AddNormalRows(const LineRecord& line) {
   }
 }
 
+void LineSolve::LineNormal(const LineRecord& line, std::int32_t k, double& nx, double& ny) const {
+  nx = line.hasFixedNormal ? line.fixedNormal[0] : std::cos(solution_[k]);
+  ny = line.hasFixedNormal ? line.fixedNormal[1] : std::sin(solution_[k]);
+}
+
 void LineSolve::AddLineRowsNewton(const LineRecord& line, std::int32_t k) {
   if (line.samples.empty()) return;
   const double l = weights_.lineWeight;
   const double angle = solution_[k];
-  const double nx = line.hasFixedNormal ? line.fixedNormal[0] : std::cos(angle);
-  const double ny = line.hasFixedNormal ? line.fixedNormal[1] : std::sin(angle);
+  double nx, ny;
+  LineNormal(line, k, nx, ny);
   const LineSample& first = line.samples.front();
   double p0u, p0v;
   SamplePoint(first, p0u, p0v);
@@ -204,6 +209,40 @@ void LineSolve::AddLineRowsNewton(const LineRecord& line, std::int32_t k) {
       iterationBuilder_.Add(k, k, 1.0);
     }
     AddRow(iterationBuilder_, q, c, count, r, &iterationRhs_);
+  }
+}
+
+void LineSolve::AddLineRowsOffset(const LineRecord& line, std::int32_t k, std::int32_t d) {
+  const double l = weights_.lineWeight;
+  const double angle = solution_[k];
+  double nx, ny;
+  LineNormal(line, k, nx, ny);
+  std::int32_t qs[4];
+  for (const LineSample& sample : line.samples) {
+    if (sample.cellI < 0) continue;
+    SampleUnknowns(sample, qs);
+    double pu, pv;
+    SamplePoint(sample, pu, pv);
+    std::int32_t q[10];
+    double c[10];
+    for (int m = 0; m < 4; ++m) {
+      q[m] = qs[m];
+      c[m] = l * nx * sample.weights[m];
+      q[4 + m] = qs[m] + 1;
+      c[4 + m] = l * ny * sample.weights[m];
+    }
+    q[8] = d;
+    c[8] = -l;
+    std::int32_t count = 9;
+    if (!line.hasFixedNormal) {
+      q[9] = k;
+      c[9] = l * (std::cos(angle) * pv - std::sin(angle) * pu);
+      count = 10;
+    } else {
+      // The reserved angle unknown of a fixed line stays where it is.
+      iterationBuilder_.Add(k, k, 1.0);
+    }
+    AddRow(iterationBuilder_, q, c, count, l * (nx * pu + ny * pv - solution_[d]), &iterationRhs_);
   }
 }
 
@@ -242,9 +281,11 @@ void LineSolve::AddPlaneRows(const PlaneRecord& plane, std::int32_t k) {
 
 void LineSolve::AddIterationTerms(std::int32_t iteration) {
   if (!settings_.useGaussNewton) lines_->FitLines();
-  std::int32_t k = 2 * vertexCount_;
+  std::int32_t k = 2 * vertexCount_, d = firstOffset_;
   for (const LineRecord& line : ActiveLines()) {
-    if (settings_.useGaussNewton) {
+    if (settings_.useGaussNewton && lineForm_ == LineForm::kOffset) {
+      AddLineRowsOffset(line, k++, d++);
+    } else if (settings_.useGaussNewton) {
       AddLineRowsNewton(line, k++);
     } else if (iteration % 2 == 0 && !line.hasFixedNormal) {
       AddChordRows(line);
@@ -266,10 +307,27 @@ void LineSolve::PrepareGaussNewton() {
   const std::int32_t planes = static_cast<std::int32_t>(lines_->GetPlanes().size());
   lines_->FitLines();
   const std::vector<LineRecord> active = ActiveLines();
-  ResizeUnknowns(2 * vertexCount_ + 8 * planes + static_cast<std::int32_t>(active.size()));
-  std::int32_t k = 2 * vertexCount_;
+  const auto lineCount = static_cast<std::int32_t>(active.size());
+  firstOffset_ = 2 * vertexCount_ + lineCount + 8 * planes;
+  ResizeUnknowns(firstOffset_ + (lineForm_ == LineForm::kOffset ? lineCount : 0));
+  std::int32_t k = 2 * vertexCount_, d = firstOffset_;
   for (const LineRecord& line : active) {
-    solution_[k++] = static_cast<float>(std::atan2(line.normal[1], line.normal[0]));
+    solution_[k] = static_cast<float>(std::atan2(line.normal[1], line.normal[0]));
+    if (lineForm_ == LineForm::kOffset) {
+      // The offset that fits the samples best at this angle: their mean.
+      double nx, ny, sum = 0.0;
+      std::int32_t count = 0;
+      LineNormal(line, k, nx, ny);
+      for (const LineSample& sample : line.samples) {
+        if (sample.cellI < 0) continue;
+        double pu, pv;
+        SamplePoint(sample, pu, pv);
+        sum += nx * pu + ny * pv;
+        ++count;
+      }
+      solution_[d++] = count > 0 ? sum / count : 0.0;
+    }
+    ++k;
   }
   lines_->FitHomographies();
   for (const PlaneRecord& plane : lines_->GetPlanes()) {
@@ -330,13 +388,20 @@ double LineSolve::LineEnergy(const LineRecord& line, std::int32_t angleIndex) co
     nx = line.normal[0];
     ny = line.normal[1];
   }
+  // The offset form measures from the line through its offset unknown, and
+  // skips the samples off the mesh as its rows do.
+  const std::int32_t offset = firstOffset_ + angleIndex - 2 * vertexCount_;
+  const bool fromOffset = settings_.useGaussNewton && lineForm_ == LineForm::kOffset &&
+                          angleIndex >= 2 * vertexCount_ && offset < unknownCount_;
   double p0u, p0v;
   SamplePoint(line.samples.front(), p0u, p0v);
+  const double origin = fromOffset ? solution_[offset] : nx * p0u + ny * p0v;
   double energy = 0.0;
   for (const LineSample& sample : line.samples) {
+    if (fromOffset && sample.cellI < 0) continue;
     double pu, pv;
     SamplePoint(sample, pu, pv);
-    const double r = weights_.lineWeight * (nx * (pu - p0u) + ny * (pv - p0v));
+    const double r = weights_.lineWeight * (nx * pu + ny * pv - origin);
     energy += 0.5 * r * r;
   }
   return energy;

@@ -9,6 +9,13 @@
 
 namespace Project {
 
+// How the Gauss-Newton road holds a line's samples on one straight line.
+// kFromFirstSample: each sample's distance, along the line's normal, from
+// its first sample, which couples every sample with the first one's cell.
+// kOffset: each sample's distance from the line n . p = d, with the offset d
+// an unknown of its own beside the angle: only those two are shared.
+enum class LineForm { kFromFirstSample, kOffset };
+
 // The weights of the line solve's own terms.
 struct LineSolveWeights {
   double lineWeight = 30.0;
@@ -22,10 +29,11 @@ struct LineSolveWeights {
 // rows), every line constraint's samples lie on one straight line, and every
 // polygon's vertices follow one homography.
 //
-// Two roads: Gauss-Newton, with one angle unknown per line and eight
-// homography unknowns per polygon, solving for a step each iteration; and the
-// alternating road, which refits each line from the mesh and pulls it
-// alternately to its chord and to its fitted line. Polygons need the first.
+// Two roads: Gauss-Newton, with one angle unknown per line (and one offset
+// in the offset form, the default) and eight homography unknowns per
+// polygon, solving for a step each iteration; and the alternating road,
+// which refits each line from the mesh and pulls it alternately to its chord
+// and to its fitted line. Polygons need the first.
 //
 // Shares the constraint store with the Solver; owns the ends it remembers
 // between solves to measure convergence.
@@ -37,9 +45,14 @@ class LineSolve : public IterativeWarpSolver {
 
   double ConstraintEnergy() const override;
   // Half the squared residuals of one line's rows, with the angle unknown at
-  // angleIndex on the Gauss-Newton road.
+  // angleIndex on the Gauss-Newton road (and, in the offset form, the
+  // offset that goes with it).
   double LineEnergy(const LineRecord& line, std::int32_t angleIndex) const;
   double ConvergenceMeasure() override;
+  // The form of the Gauss-Newton road's line rows; takes effect at the next
+  // Solve.
+  void SetLineForm(LineForm form) { lineForm_ = form; }
+  LineForm GetLineForm() const { return lineForm_; }
 
  protected:
   void AddConformalQuad(std::int32_t i, std::int32_t j) override;
@@ -56,6 +69,10 @@ class LineSolve : public IterativeWarpSolver {
   void AddChordRows(const LineRecord& line);
   void AddNormalRows(const LineRecord& line);
   void AddLineRowsNewton(const LineRecord& line, std::int32_t k);
+  // The offset form's rows, with the angle at k and the offset at d.
+  void AddLineRowsOffset(const LineRecord& line, std::int32_t k, std::int32_t d);
+  // The line's normal at the current solution, its angle at k.
+  void LineNormal(const LineRecord& line, std::int32_t k, double& nx, double& ny) const;
   void AddPlaneRows(const PlaneRecord& plane, std::int32_t k);
 
   // The four unknowns of a sample's corners (u; v follows each) and its
@@ -73,6 +90,10 @@ class LineSolve : public IterativeWarpSolver {
   const LineSolveWeights weights_;
   std::vector<std::vector<Point2f>> lastLineEnds_;
   std::vector<std::vector<Point2f>> lastPlaneEnds_;
+  LineForm lineForm_ = LineForm::kOffset;
+  // The offset form's first offset unknown, after the angles and the
+  // polygons' homographies; as of the last PrepareGaussNewton.
+  std::int32_t firstOffset_ = 0;
 };
 
 }  // namespace Project

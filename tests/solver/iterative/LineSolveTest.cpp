@@ -173,8 +173,9 @@ TEST(LineSolve, AnchorVariants) {
 }
 
 // No constraints: one solve. A new line: the first measure is unknown, so
-// at least two. The Gauss-Newton road adds one angle per line, and a fixed
-// line's angle does not move while a free line's follows its result.
+// at least two. The Gauss-Newton road adds an angle and an offset per line,
+// and a fixed line's angle does not move while a free line's follows its
+// result.
 TEST(LineSolve, StoppingRuleAndNewtonUnknowns) {
   Scene scene;
   const auto solve = scene.Make();
@@ -190,7 +191,8 @@ TEST(LineSolve, StoppingRuleAndNewtonUnknowns) {
   solve->Solve();
   EXPECT_TRUE(solve->Succeeded());
   EXPECT_GE(solve->IterationsRun(), 2);
-  ASSERT_EQ(solve->UnknownCount(), vertexUnknowns + 2);
+  // Angles first, then (the offset form) one offset per line.
+  ASSERT_EQ(solve->UnknownCount(), vertexUnknowns + 4);
   // The free line's angle is its normal's in the result: the ends' chord is
   // perpendicular to (cos a, sin a).
   const std::vector<Point2f> ends = scene.lines->TraceSamples(scene.lines->GetLines()[0], 2);
