@@ -172,7 +172,6 @@ void LineSolve::LineNormal(const LineRecord& line, std::int32_t k, double& nx, d
 void LineSolve::AddLineRowsNewton(const LineRecord& line, std::int32_t k) {
   if (line.samples.empty()) return;
   const double l = weights_.lineWeight;
-  const double angle = solution_[k];
   double nx, ny;
   LineNormal(line, k, nx, ny);
   const LineSample& first = line.samples.front();
@@ -199,22 +198,26 @@ void LineSolve::AddLineRowsNewton(const LineRecord& line, std::int32_t k) {
       q[12 + m] = qs[m] + 1;
       c[12 + m] = l * ny * sample.weights[m];
     }
-    std::int32_t count = 16;
-    if (!line.hasFixedNormal) {
-      q[16] = k;
-      c[16] = l * (std::cos(angle) * ey - std::sin(angle) * ex);
-      count = 17;
-    } else {
-      // The reserved angle unknown of a fixed line stays where it is.
-      iterationBuilder_.Add(k, k, 1.0);
-    }
-    AddRow(iterationBuilder_, q, c, count, r, &iterationRhs_);
+    AddLineRow(line, k, ex, ey, q, c, 16, r);
   }
+}
+
+void LineSolve::AddLineRow(const LineRecord& line, std::int32_t k, double ex, double ey,
+                           std::int32_t* q, double* c, std::int32_t count, double r) {
+  if (!line.hasFixedNormal) {
+    const double angle = solution_[k];
+    q[count] = k;
+    c[count] = weights_.lineWeight * (std::cos(angle) * ey - std::sin(angle) * ex);
+    ++count;
+  } else {
+    // The reserved angle unknown of a fixed line stays where it is.
+    iterationBuilder_.Add(k, k, 1.0);
+  }
+  AddRow(iterationBuilder_, q, c, count, r, &iterationRhs_);
 }
 
 void LineSolve::AddLineRowsOffset(const LineRecord& line, std::int32_t k, std::int32_t d) {
   const double l = weights_.lineWeight;
-  const double angle = solution_[k];
   double nx, ny;
   LineNormal(line, k, nx, ny);
   std::int32_t qs[4];
@@ -233,16 +236,7 @@ void LineSolve::AddLineRowsOffset(const LineRecord& line, std::int32_t k, std::i
     }
     q[8] = d;
     c[8] = -l;
-    std::int32_t count = 9;
-    if (!line.hasFixedNormal) {
-      q[9] = k;
-      c[9] = l * (std::cos(angle) * pv - std::sin(angle) * pu);
-      count = 10;
-    } else {
-      // The reserved angle unknown of a fixed line stays where it is.
-      iterationBuilder_.Add(k, k, 1.0);
-    }
-    AddRow(iterationBuilder_, q, c, count, l * (nx * pu + ny * pv - solution_[d]), &iterationRhs_);
+    AddLineRow(line, k, pu, pv, q, c, 9, l * (nx * pu + ny * pv - solution_[d]));
   }
 }
 

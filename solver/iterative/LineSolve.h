@@ -71,6 +71,13 @@ class LineSolve : public IterativeWarpSolver {
   void AddLineRowsNewton(const LineRecord& line, std::int32_t k);
   // The offset form's rows, with the angle at k and the offset at d.
   void AddLineRowsOffset(const LineRecord& line, std::int32_t k, std::int32_t d);
+  // Adds a line row of `count` entries in q and c (which have room for one
+  // more) and residual r, whose residual is n . e up to a constant: with the
+  // angle's column, the derivative of n . e by the angle, when the direction
+  // is free, else with the fixed line's reserved angle held by a unit
+  // diagonal.
+  void AddLineRow(const LineRecord& line, std::int32_t k, double ex, double ey, std::int32_t* q,
+                  double* c, std::int32_t count, double r);
   // The line's normal at the current solution, its angle at k.
   void LineNormal(const LineRecord& line, std::int32_t k, double& nx, double& ny) const;
   void AddPlaneRows(const PlaneRecord& plane, std::int32_t k);
