@@ -50,13 +50,10 @@ struct Variant {
   std::int32_t level = 6;
   bool gaussNewton = true;
   bool cacheOrder = false;
-  // The default road: line rows in the offset form, systems solved on the
-  // last factor where it serves, the sparse library's loops on the solving
-  // thread alone; or, part by part, the form from the first sample, every
-  // system factored afresh, the library's loops on the threads it asks for.
-  bool keepFactor = true;
+  // The default road, or part by part the road before it: line rows from
+  // the first sample, and the solve choices off.
+  SolveChoices choices;
   LineForm form = LineForm::kOffset;
-  bool serialLoops = true;
   // Time the edit that adds the last line to the others, solved already,
   // rather than the solve of all of them on the plain mesh.
   bool edit = false;
@@ -89,9 +86,8 @@ class Bench {
                }),
         edit_(variant.edit),
         drag_(variant.drag),
-        keepFactor_(variant.keepFactor),
-        form_(variant.form),
-        serialLoops_(variant.serialLoops) {
+        choices_(variant.choices),
+        form_(variant.form) {
     lines_ = scene_.Pick(variant.lines, true);
     if (edit_ || drag_) {
       // The line added is a free one: it leaves the verticals, and so the
@@ -179,9 +175,8 @@ class Bench {
   // The solver's warp, on this bench's road.
   IterativeWarpSolver* Warp() {
     auto* warp = dynamic_cast<LineSolve*>(scene_.solver().GetWarp().get());
-    warp->SetFactorReuse(keepFactor_);
+    warp->SetSolveChoices(choices_);
     warp->SetLineForm(form_);
-    warp->SetSerialLibraryLoops(serialLoops_);
     return warp;
   }
 
@@ -189,9 +184,8 @@ class Bench {
   std::vector<PickedLine> lines_;
   bool edit_;
   bool drag_;
-  bool keepFactor_;
+  SolveChoices choices_;
   LineForm form_;
-  bool serialLoops_;
   bool solvedBefore_ = false;
   std::int32_t drags_ = 0;
 };
@@ -263,30 +257,31 @@ void RunPair(benchmark::State& state, const Variant& variant, const Variant& bas
 }
 
 // The default road beside the road before it (rows from the first sample,
-// every system factored afresh, the library's loops on its own threads), at
-// mesh levels 5 to 8 with 0, 10 and 40 lines, and for the interactive edits
-// at the default level: one line added (edit 1), one line's end dragged
-// (edit 2). The fourth argument leaves one part of the default road out:
-// 1 the kept factor, 2 the serial library loops, 3 the offset form.
+// every system factored afresh in the library's own order, its loops on its
+// own threads), at mesh levels 5 to 8 with 0, 10 and 40 lines, and for the
+// interactive edits at the default level: one line added (edit 1), one
+// line's end dragged (edit 2). The fourth argument leaves one part of the
+// default road out: 1 the kept factor, 2 the serial library loops, 3 the
+// offset form (and with it the vertex-block order), 4 the vertex-block order.
 void BM_Roads(benchmark::State& state) {
   Variant variant;
   variant.level = static_cast<std::int32_t>(state.range(0));
   variant.lines = static_cast<std::size_t>(state.range(1));
   variant.edit = state.range(2) == 1;
   variant.drag = state.range(2) == 2;
-  variant.keepFactor = state.range(3) != 1;
-  variant.serialLoops = state.range(3) != 2;
+  variant.choices.keepFactor = state.range(3) != 1;
+  variant.choices.serialLibraryLoops = state.range(3) != 2;
+  variant.choices.vertexBlockOrder = state.range(3) != 4;
   variant.form = state.range(3) == 3 ? LineForm::kFromFirstSample : LineForm::kOffset;
   Variant baseline = variant;
-  baseline.keepFactor = false;
-  baseline.serialLoops = false;
+  baseline.choices = {false, false, false};
   baseline.form = LineForm::kFromFirstSample;
   RunPair(state, variant, baseline, "vs_before");
 }
 BENCHMARK(BM_Roads)
     ->ArgNames({"level", "lines", "edit", "road"})
     ->ArgsProduct({{5, 6, 7}, {0, 10, 40}, {0}, {0}})
-    ->ArgsProduct({{6}, {10, 40}, {0}, {1, 2, 3}})
+    ->ArgsProduct({{6}, {10, 40}, {0}, {1, 2, 3, 4}})
     ->Args({6, 10, 1, 0})
     ->Args({6, 10, 2, 0})
     ->Args({6, 40, 2, 0})

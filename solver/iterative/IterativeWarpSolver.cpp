@@ -311,9 +311,26 @@ void IterativeWarpSolver::Reset() {
   if (sparse_ != nullptr) sparse_->DropFactor();
 }
 
-void IterativeWarpSolver::SetFactorReuse(bool reuse) {
-  reuseFactor_ = reuse;
-  if (!reuse) sparse_.reset();
+void IterativeWarpSolver::SetSolveChoices(const SolveChoices& choices) {
+  choices_ = choices;
+  if (!choices.keepFactor) sparse_.reset();
+}
+
+EliminationOrder& IterativeWarpSolver::SolveOrder(EliminationOrder& vertexFirst) {
+  if (settings_.cachePermutation || !choices_.vertexBlockOrder || !IterationRowsStayInCells()) {
+    return order_;
+  }
+  if (!vertexOrderTried_) {
+    vertexOrderTried_ = true;
+    if (!OrderLeadingBlock(*constantMatrix_, 2 * vertexCount_, vertexOrder_)) vertexOrder_.clear();
+    vertexOrder_.resize(vertexOrder_.empty() ? 0 : 2 * vertexCount_);
+  }
+  if (vertexOrder_.empty()) return order_;
+  vertexFirst.cachePermutation = true;
+  vertexFirst.hasPermutation = true;
+  vertexFirst.permutation = vertexOrder_;
+  RelabelPermutationTail(vertexFirst, 2 * vertexCount_, unknownCount_);
+  return vertexFirst;
 }
 
 void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
@@ -331,7 +348,7 @@ void IterativeWarpSolver::ResizeUnknowns(std::int32_t unknowns) {
 
 bool IterativeWarpSolver::SolveSystem(SparseSession& sparse, bool tryKeptFactor,
                                       const CompressedMatrix& system, std::span<const double> rhs,
-                                      std::span<double> answer) {
+                                      std::span<double> answer, EliminationOrder& order) {
   SparseSolveStats stats;
   if (tryKeptFactor) {
     const bool solved = sparse.SolvePreconditioned(system, rhs, answer, kNearFactor, &stats);
@@ -340,7 +357,7 @@ bool IterativeWarpSolver::SolveSystem(SparseSession& sparse, bool tryKeptFactor,
     if (solved) return true;
     stats = SparseSolveStats{};
   }
-  const bool solved = sparse.Solve(system, rhs, answer, order_, &stats);
+  const bool solved = sparse.Solve(system, rhs, answer, order, &stats);
   ++profile_.factorizations;
   AddStats(profile_, stats);
   return solved;
@@ -361,11 +378,13 @@ void IterativeWarpSolver::Solve() {
   // from it, and factors every system.
   const SparseRoad road =
       settings_.useGaussNewton && settings_.usePardiso ? SparseRoad::kPardiso : SparseRoad::kDss;
-  const bool keep = settings_.useGaussNewton && reuseFactor_;
+  const bool keep = settings_.useGaussNewton && choices_.keepFactor;
   if (keep && sparse_ == nullptr) sparse_ = std::make_unique<SparseSession>(road);
   std::unique_ptr<SparseSession> local = keep ? nullptr : std::make_unique<SparseSession>(road);
   SparseSession& sparse = keep ? *sparse_ : *local;
-  sparse.SetSerialLibraryLoops(serialLoops_);
+  sparse.SetSerialLibraryLoops(choices_.serialLibraryLoops);
+  EliminationOrder vertexFirst;
+  EliminationOrder& order = SolveOrder(vertexFirst);
   for (std::int32_t iteration = 0; iteration < settings_.iterationCount; ++iteration) {
     start = Clock::now();
     const SolveProfile before = profile_;
@@ -386,14 +405,14 @@ void IterativeWarpSolver::Solve() {
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r];
       }
-      solved = SolveSystem(sparse, false, system, rhs, step);
+      solved = SolveSystem(sparse, false, system, rhs, step, order);
       if (solved) solution_ = step;
     } else {
       constantMatrix_->MultiplySymmetric(solution_, rhs);
       for (std::int32_t r = 0; r < unknownCount_; ++r) {
         rhs[r] = constantRhs_[r] + iterationRhs_[r] - rhs[r];
       }
-      solved = SolveSystem(sparse, keep && sparse.HasFactor(), system, rhs, step);
+      solved = SolveSystem(sparse, keep && sparse.HasFactor(), system, rhs, step, order);
       if (solved) {
         for (std::int32_t r = 0; r < unknownCount_; ++r) solution_[r] += step[r];
       }

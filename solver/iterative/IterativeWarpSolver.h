@@ -55,6 +55,23 @@ struct SolveProfile {
   std::int32_t gradientSteps = 0;   // conjugate-gradient steps on a kept factor
 };
 
+// How the warp's sparse systems are solved. The defaults are the shipped
+// road; each part can be turned off to compare with the road before it.
+struct SolveChoices {
+  // The Gauss-Newton road keeps its session and last factor between
+  // solves, and solves an unchanged system on that factor; off, every
+  // system is factored afresh in a session of its solve.
+  bool keepFactor = true;
+  // The sparse library's own OpenMP loops run on the solving thread alone.
+  bool serialLibraryLoops = true;
+  // Where the iteration rows add no coupling between vertices (see
+  // IterationRowsStayInCells), the elimination order is the constant
+  // part's vertex block by nested dissection, found once, with the other
+  // unknowns last; off, the library orders each new pattern itself. A
+  // cached order (the settings' cachePermutation) is kept either way.
+  bool vertexBlockOrder = true;
+};
+
 // The warp as the minimum of a quadratic energy over the (u, v) of every
 // grid vertex. The constant part (anchors to a closed-form regulariser, and
 // whatever conformal and smoothness terms a subclass adds) is assembled once;
@@ -112,14 +129,9 @@ class IterativeWarpSolver : public SphereWarp {
   std::int32_t IterationsRun() const { return iterationsRun_; }
   const SolveProfile& Profile() const { return profile_; }
   void ClearProfile() { profile_ = SolveProfile{}; }
-  // Whether the Gauss-Newton road solves on a kept factor (the default), or
-  // factors every system afresh; for comparing the two. Turning it off
-  // forgets the factor.
-  void SetFactorReuse(bool reuse);
-  bool FactorReuse() const { return reuseFactor_; }
-  // Whether the sparse library's OpenMP loops run on the solving thread
-  // alone (the default); for comparing.
-  void SetSerialLibraryLoops(bool serial) { serialLoops_ = serial; }
+  // How the systems are solved; for comparing with the road before.
+  void SetSolveChoices(const SolveChoices& choices);
+  const SolveChoices& GetSolveChoices() const { return choices_; }
 
  protected:
   // The constant part, assembled when first needed (a solve, the accessors):
@@ -146,10 +158,18 @@ class IterativeWarpSolver : public SphereWarp {
 
   // Resizes the system to unknowns, keeping what it holds.
   void ResizeUnknowns(std::int32_t unknowns);
+  // Whether the iteration rows add no coupling between vertices beyond the
+  // constant part's: each row's vertex unknowns are the corners of one
+  // cell, which the conformal rows couple already (a cell off the mesh that
+  // a line crosses is not, which costs some fill, never accuracy). No, here.
+  virtual bool IterationRowsStayInCells() const { return false; }
   // Solves one system, first on the session's kept factor when asked, then
-  // by a fresh factorisation; counts both in the profile.
+  // by a fresh factorisation in the given order; counts both in the profile.
   bool SolveSystem(SparseSession& sparse, bool tryKeptFactor, const CompressedMatrix& system,
-                   std::span<const double> rhs, std::span<double> answer);
+                   std::span<const double> rhs, std::span<double> answer, EliminationOrder& order);
+  // The order the systems of this solve are factored in: the settings'
+  // cached order, or the vertex block's (made when first needed).
+  EliminationOrder& SolveOrder(EliminationOrder& vertexFirst);
   // Whether the vertex is on the half of a folded border without unknowns.
   bool IsFoldedHalf(std::int32_t i, std::int32_t j) const;
 
@@ -191,8 +211,12 @@ class IterativeWarpSolver : public SphereWarp {
   // asks of the vertices on its way: once each, not once per walk.
   mutable std::vector<std::atomic<std::uint8_t>> pictureState_;
   bool constantAssembled_ = false;
-  bool reuseFactor_ = true;
-  bool serialLoops_ = true;
+  SolveChoices choices_;
+  // The constant part's vertex block by nested dissection, one-based, 2 V
+  // long; its pattern never changes, so it is found once. Empty until
+  // needed, or when the library could not order it.
+  std::vector<std::int32_t> vertexOrder_;
+  bool vertexOrderTried_ = false;
   // The Gauss-Newton road's session while factors are kept: its last factor
   // outlives the Solve that made it. Null until the first such solve.
   std::unique_ptr<SparseSession> sparse_;

@@ -296,6 +296,10 @@ void LineSolve::AddIterationTerms(std::int32_t iteration) {
   }
 }
 
+bool LineSolve::IterationRowsStayInCells() const {
+  return settings_.useGaussNewton && lineForm_ == LineForm::kOffset;
+}
+
 void LineSolve::PrepareGaussNewton() {
   for (PlaneRecord& plane : lines_->GetPlanes()) lines_->SamplePlane(plane);
   const std::int32_t planes = static_cast<std::int32_t>(lines_->GetPlanes().size());

@@ -59,6 +59,10 @@ class LineSolve : public IterativeWarpSolver {
   void AddSmoothnessVertex(std::int32_t i, std::int32_t j) override;
   void AddIterationTerms(std::int32_t iteration) override;
   void PrepareGaussNewton() override;
+  // On the Gauss-Newton road in the offset form: a line row reaches the
+  // corners of its sample's cell and the line's own angle and offset, a
+  // polygon row one vertex and the homography.
+  bool IterationRowsStayInCells() const override;
 
  private:
   struct Vertex {

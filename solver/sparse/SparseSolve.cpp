@@ -336,6 +336,49 @@ bool SparseSession::SolvePreconditioned(const CompressedMatrix& matrix, std::spa
   return converged;
 }
 
+bool OrderLeadingBlock(const CompressedMatrix& matrix, std::int32_t leading,
+                       std::vector<std::int32_t>& permutation) {
+  const std::int32_t n = matrix.Rows();
+  if (matrix.Columns() != n || !matrix.IsComplete() || leading < 1 || leading > n) return false;
+  // The leading block's upper triangle, read as the lower one by columns.
+  std::vector<int> columnStart(static_cast<std::size_t>(leading) + 1, 0), rowIndex;
+  std::vector<double> values;
+  for (std::int32_t r = 0; r < leading; ++r) {
+    for (std::int32_t k = matrix.RowStart()[r] - 1; k < matrix.RowStart()[r + 1] - 1; ++k) {
+      if (matrix.Column()[k] - 1 >= leading) break;
+      rowIndex.push_back(matrix.Column()[k] - 1);
+      values.push_back(matrix.Value()[k]);
+    }
+    columnStart[r + 1] = static_cast<int>(rowIndex.size());
+  }
+  cholmod_common common{};
+  cholmod_start(&common);
+  common.print = 0;
+  cholmod_sparse a{};
+  a.nrow = a.ncol = static_cast<std::size_t>(leading);
+  a.nzmax = rowIndex.size();
+  a.p = columnStart.data();
+  a.i = rowIndex.data();
+  a.x = values.data();
+  a.stype = -1;
+  a.itype = CHOLMOD_INT;
+  a.xtype = CHOLMOD_REAL;
+  a.dtype = CHOLMOD_DOUBLE;
+  a.sorted = true;
+  a.packed = true;
+  std::vector<int> order(static_cast<std::size_t>(leading)), parent(order.size()),
+      member(order.size());
+  const bool ordered = cholmod_nested_dissection(&a, nullptr, 0, order.data(), parent.data(),
+                                                 member.data(), &common) >= 0 &&
+                       common.status == CHOLMOD_OK;
+  cholmod_finish(&common);
+  if (!ordered) return false;
+  permutation.resize(static_cast<std::size_t>(n));
+  std::transform(order.begin(), order.end(), permutation.begin(), [](int k) { return k + 1; });
+  for (std::int32_t k = leading; k < n; ++k) permutation[k] = k + 1;
+  return true;
+}
+
 bool SolveWithDss(const CompressedMatrix& matrix, std::span<const double> rhs,
                   std::span<double> solution, EliminationOrder& order, SparseSolveStats* stats) {
   SparseSession session(SparseRoad::kDss);

@@ -3,6 +3,7 @@
 #include <cstddef>
 #include <memory>
 #include <span>
+#include <vector>
 
 #include "solver/sparse/CompressedMatrix.h"
 #include "solver/sparse/EliminationOrder.h"
@@ -56,6 +57,14 @@ bool SolveWithDss(const CompressedMatrix& matrix, std::span<const double> rhs,
 bool SolveWithPardiso(const CompressedMatrix& matrix, std::span<const double> rhs,
                       std::span<double> solution, EliminationOrder& order,
                       SparseSolveStats* stats = nullptr);
+
+// A fill-reducing order for a system whose first `leading` unknowns are the
+// bulk of it, a mesh, and whose others are few and reach far (the warp's
+// line and polygon unknowns): nested dissection of the leading block alone,
+// then the others last in their own order. One-based, as EliminationOrder
+// holds it. False when the sizes disagree or the library fails.
+bool OrderLeadingBlock(const CompressedMatrix& matrix, std::int32_t leading,
+                       std::vector<std::int32_t>& permutation);
 
 // The two roads, for a session.
 enum class SparseRoad { kDss, kPardiso };

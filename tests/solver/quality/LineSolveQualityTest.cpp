@@ -111,10 +111,10 @@ TEST(LineSolveQuality, ALoneLineMeetsTheAimsToItsEnds) {
 }
 
 // The solve as it ships beside the road before it (rows measured from each
-// line's first sample, every system factored afresh, the sparse library's
-// loops on the threads it asks for), ten lines on the plainly solved mesh:
-// the two meshes lie close, in pixels of an output of the photograph's
-// width that shows the whole mesh.
+// line's first sample, every system factored afresh in the library's own
+// order, its loops on the threads it asks for), ten lines on the plainly
+// solved mesh: the two meshes lie close, in pixels of an output of the
+// photograph's width that shows the whole mesh.
 TEST(LineSolveQuality, TheSolveMatchesTheRoadBeforeIt) {
   for (const QualityCase& c : Cases()) {
     SCOPED_TRACE(c.camera.name);
@@ -122,8 +122,7 @@ TEST(LineSolveQuality, TheSolveMatchesTheRoadBeforeIt) {
     auto road = [](QualityScene& scene, bool shipped) {
       auto* warp = dynamic_cast<LineSolve*>(scene.solver().GetWarp().get());
       warp->SetLineForm(shipped ? LineForm::kOffset : LineForm::kFromFirstSample);
-      warp->SetFactorReuse(shipped);
-      warp->SetSerialLibraryLoops(shipped);
+      warp->SetSolveChoices({shipped, shipped, shipped});
     };
     for (QualityScene* scene : {&now, &before}) {
       std::vector<PickedLine> lines = scene->Pick(10, true);

@@ -369,5 +369,26 @@ TEST(SparseSession, SolvesANearbyMatrixOnItsKeptFactor) {
   EXPECT_FALSE(session.SolvePreconditioned(CompressedMatrix(weak.builder), weak.rhs, x, limits));
 }
 
+// The leading block's order is a permutation of it, the rest follow in
+// their own order, and a solve in that order is the dense one; sizes that
+// disagree are refused.
+TEST(OrderLeadingBlock, OrdersTheBlockAndPutsTheRestLast) {
+  const TestSystem s = LeastSquaresSystem(60, 25);
+  const CompressedMatrix matrix(s.builder);
+  std::vector<std::int32_t> order;
+  ASSERT_TRUE(OrderLeadingBlock(matrix, 50, order));
+  ASSERT_EQ(order.size(), 60u);
+  std::vector<std::int32_t> head(order.begin(), order.begin() + 50);
+  std::sort(head.begin(), head.end());
+  for (int k = 0; k < 50; ++k) EXPECT_EQ(head[k], k + 1);
+  for (int k = 50; k < 60; ++k) EXPECT_EQ(order[k], k + 1);
+  EliminationOrder given{order, true, true};
+  std::vector<double> x(s.n);
+  ASSERT_TRUE(SolveWithPardiso(matrix, s.rhs, x, given));
+  ExpectSolves(x, s);
+  EXPECT_FALSE(OrderLeadingBlock(matrix, 61, order));
+  EXPECT_FALSE(OrderLeadingBlock(matrix, 0, order));
+}
+
 }  // namespace
 }  // namespace Project
