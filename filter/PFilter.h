@@ -90,6 +90,16 @@ class PFilter : public Tarsa::CQuillmarkFilter,
   // The same as focal lengths in pixels.
   bool ImageFocalRange(float& low, float& high);
 
+  // Builds the grid and solves it as a scripted run does, from the settings
+  // alone: the dialog's OK ends with this, so that what it writes is what a
+  // replay of the stored action writes.
+  void SolveAfresh();
+  // One solve of the grid as it stands, with its constraints.
+  void Solve();
+
+  // What the photo's metadata says of its focal length, for As Shot.
+  FocalData PhotoFocalData() const { return MetadataFocalData(); }
+
   // The run's lens profile matcher, made at first use.
   PLensMatcher& LensMatcher();
   // The lens record's crop ratio to the photo (see PLensMatcher::CropRatio),
@@ -129,12 +139,6 @@ class PFilter : public Tarsa::CQuillmarkFilter,
   // when it closed with OK after the final image went to the host. The
   // filter alone has no workspace and refuses.
   virtual bool RunDialog();
-  // Builds the grid and solves it as a scripted run does, from the settings
-  // alone: the dialog's OK ends with this, so that what it writes is what a
-  // replay of the stored action writes.
-  void SolveAfresh();
-  // One solve of the grid as it stands, with its constraints.
-  void Solve();
 
  private:
   void OpenMetadata();

@@ -148,6 +148,34 @@ void PPreview::ToDisplay(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area,
   }
 }
 
+void PPreview::ReadDetail(const Tarsa::CRect& area, bool source, std::vector<std::uint8_t>& rgba) {
+  const Tarsa::CRect wanted = area.Intersect(contentRect_);
+  rgba.assign(std::size_t(area.Width()) * area.Height() * 4, 0);
+  if (wanted.IsEmpty()) return;
+  std::uint32_t steps = 0;
+  const Tarsa::CPixmap* pixels = nullptr;
+  if (!source && run_.RenderSettings().previewResult != 0) {
+    PResult& from = hub_.ResultFull();
+    BringUpToDate(from, wanted, true, steps);
+    pixels = from.Pixels();
+  } else {
+    PSource& from = hub_.Source();
+    BringUpToDate(from, wanted, true, steps);
+    pixels = from.Pixels();
+  }
+  Tarsa::CMemoryPixmap copy(wanted, pixels->Planes(), pixels->Depth());
+  copy.CopyFrom(*pixels, wanted);
+  std::vector<std::uint8_t> part(std::size_t(wanted.Width()) * wanted.Height() * 4);
+  ToDisplay(copy, wanted, part.data());
+  const std::size_t rowBytes = std::size_t(wanted.Width()) * 4;
+  for (std::int32_t y = 0; y < std::int32_t(wanted.Height()); ++y) {
+    std::copy_n(part.data() + std::size_t(y) * rowBytes, rowBytes,
+                rgba.data() + (std::size_t(wanted.top - area.top + y) * area.Width() +
+                               std::size_t(wanted.left - area.left)) *
+                                  4);
+  }
+}
+
 void PPreview::Invalidate(const Tarsa::CRect& area) {
   const Tarsa::CRect stale = area.Intersect(viewRect_);
   if (stale.IsEmpty()) return;

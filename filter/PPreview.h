@@ -47,6 +47,11 @@ class PPreview : public Tarsa::CPixProcess {
   // Everything is made again: a new mesh, or Preview switched.
   void InvalidateAll();
 
+  // The picture at full size over area (image coordinates, inside the
+  // image) as RGBA rows of area's width: the result with Preview on, else
+  // (or with source set) the photograph. For the loupes, which show 100 %.
+  void ReadDetail(const Tarsa::CRect& area, bool source, std::vector<std::uint8_t>& rgba);
+
  private:
   // Turns the colour planes and the transparency of area into RGBA.
   void ToDisplay(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area, std::uint8_t* rgba);

@@ -370,7 +370,10 @@ void PResult::RenderTile(Tarsa::CMemoryPixmap& dest, const Tarsa::CPixmap& sourc
   const bool textured = pass.drawGeometry && pass.textured;
   // With one pass and the stage's own source, textures come from the kept
   // source tiles, and the next tile's is filled while this one draws.
-  const bool fromBlocks = textured && passes == 1 && &source == sourcePixels_();
+  // The kept source tiles follow the full source's tiles, read once each;
+  // a reduced source is drawn from as it stands.
+  const bool fromBlocks = textured && passes == 1 && &source == sourcePixels_() &&
+                          &source_ == static_cast<Tarsa::CPixProcess*>(&hub_.Source());
   const bool drawn = inflight_.valid && inflight_.col == col && inflight_.row == row &&
                      inflight_.placement == place && inflight_.draw == gl.DrawCount() && fromBlocks;
   inflight_.valid = false;

@@ -1,7 +1,7 @@
 #include "workspace/EntryFI.h"
 
-#include "filter/PFilter.h"
 #include "framework/plugin/CPluginEntry.h"
+#include "workspace/PWorkspaceFilter.h"
 
 // The module is built with hidden visibility; this is the one symbol it shows.
 extern "C" __attribute__((visibility("default"))) void EntryFI(std::int16_t selector,
@@ -9,5 +9,5 @@ extern "C" __attribute__((visibility("default"))) void EntryFI(std::int16_t sele
                                                                std::intptr_t* dataSlot,
                                                                std::int16_t* result) {
   Tarsa::CPluginEntry::Dispatch(selector, record, dataSlot, result,
-                                [] { return new Project::PFilter(); });
+                                [] { return new Project::PWorkspaceFilter(); });
 }

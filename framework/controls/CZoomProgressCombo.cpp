@@ -215,10 +215,16 @@ void CZoomProgressCombo::HandleMessage(CMessage& message) {
       Commit();
       message.SetHandled();
       return;
-    case kKey_Escape:
+    case kKey_Escape: {
+      // Escape takes back a typed zoom; with nothing typed it is the
+      // window's (a dialog's Cancel).
+      CZoomPane* pane = ZoomPane();
+      const bool typed = pane != nullptr && text_ != FormatZoom(pane->Zoom());
       UpdateZoomControls();
+      if (!typed) break;
       message.SetHandled();
       return;
+    }
     case kKey_Up:
     case kKey_Down:
       if (CZoomPane* pane = ZoomPane()) {

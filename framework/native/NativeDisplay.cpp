@@ -32,6 +32,11 @@ bool StartWindowSystem() {
   // A click that activates a window also acts on what it lands on, as a
   // user of a dialog expects.
   SDL_SetHint(SDL_HINT_MOUSE_FOCUS_CLICKTHROUGH, "1");
+  // Windows show their pixels through the window system's own image
+  // transfer, not a GL context of SDL's: the module renders with a GL
+  // context of its own on the same thread, which would leave SDL's current
+  // context elsewhere and the windows black.
+  SDL_SetHint(SDL_HINT_FRAMEBUFFER_ACCELERATION, "0");
   if (SDL_InitSubSystem(SDL_INIT_VIDEO) != 0) return false;
   if (std::getenv("DISPLAY") != nullptr) XSetErrorHandler(IgnoreXError);
   gVideoStarted = true;

@@ -45,6 +45,10 @@ class CProcess : public CExecutable, public CStringSource {
   static CProcess* Current();
 
   CNativeEventSource& EventSource() { return *source_; }
+  // A process made before it knew it would show windows (a plug-in's, made
+  // at the host's first call) takes the window system's events from here
+  // on. Only before any timer runs: a running one stays with the old source.
+  void UseEventSource(std::unique_ptr<CNativeEventSource> source) { source_ = std::move(source); }
   double Now() const { return source_->Now(); }
 
   // One pass of the loop.

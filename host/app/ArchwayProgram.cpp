@@ -62,8 +62,9 @@ constexpr const char* kUsageText =
     "Progress is shown on a terminal. Ctrl-C stops the run: the current\n"
     "image is not written and no further image is started.\n"
     "\n"
-    "Exit status: 0 all images corrected, 1 an image or file failed (the others\n"
-    "are still done), 2 a wrong command line, 130 interrupted.\n";
+    "Exit status: 0 all images corrected (or, with edit, closed by the user),\n"
+    "1 an image or file failed (the others are still done), 2 a wrong command\n"
+    "line, 130 interrupted.\n";
 
 void Report(const std::string& message) { std::fprintf(stderr, "archway: %s\n", message.c_str()); }
 
@@ -129,6 +130,11 @@ ImageResult CorrectImage(const CommandLine& line, PluginModule& module,
   if (outcome.status == FilterRun::Outcome::Status::kCancelled || Interruption::Requested()) {
     Report("interrupted; '" + job.output + "' was not written");
     return ImageResult::kInterrupted;
+  }
+  if (outcome.status == FilterRun::Outcome::Status::kClosed) {
+    Report("'" + job.input + "': the workspace closed without correcting it; '" + job.output +
+           "' was not written");
+    return ImageResult::kDone;
   }
   if (outcome.status == FilterRun::Outcome::Status::kFailed) {
     Report("'" + job.input + "': not corrected: " + outcome.failure);

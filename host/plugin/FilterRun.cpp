@@ -80,6 +80,14 @@ Outcome FilterRun::Run(Tarsa::HostEntryProc entry, HostDocument& document, const
   if (interactive) opening.insert(opening.begin(), Tarsa::kSelectorParameters);
   for (int16_t selector : opening) {
     const int16_t result = call(selector);
+    // An interactive start answers 1 when the user closed the workspace
+    // with Cancel: nothing was taken, and that is no failure.
+    if (result == 1 && interactive && selector == Tarsa::kSelectorStart &&
+        !observer.AbortRequested()) {
+      Outcome closed;
+      closed.status = Outcome::Status::kClosed;
+      return closed;
+    }
     if (result != 0) return refused(selector, result);
   }
 

@@ -32,7 +32,8 @@ class FilterRun {
   };
 
   struct Outcome {
-    enum class Status { kDone, kFailed, kCancelled };
+    // kClosed: the user closed the workspace without correcting the image.
+    enum class Status { kDone, kFailed, kCancelled, kClosed };
     Status status = Status::kDone;
     // For kFailed: what went wrong, in words for the user.
     std::string failure;

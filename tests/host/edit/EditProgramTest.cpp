@@ -1,0 +1,289 @@
+// `archway edit` as a user runs it: the workspace opens on a generated
+// photograph under the test's own X server, is driven with real X input
+// (xdotool), and is read back from the server's pixels.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <chrono>
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "host/io/HostDocument.h"
+#include "host/io/ImageFile.h"
+#include "tests/host/app/ProgramRun.h"
+#include "tests/support/ScreenGrab.h"
+#include "tests/support/TestSupport.h"
+
+namespace Host::testing {
+namespace {
+
+#ifdef ARCHWAY_REAL_MODULE
+
+// The generated photograph.
+constexpr int kPhotoWidth = 1200;
+constexpr int kPhotoHeight = 800;
+// Where the pane shows no picture.
+constexpr std::uint8_t kPaneGrey = 0x80;
+// The workspace solves and renders the first preview well within this on
+// the slowest machine the tests run on (a shared 2-core one).
+constexpr auto kOpening = std::chrono::seconds(30);
+
+std::string Shell(const std::string& command) {
+  std::string output;
+  FILE* pipe = ::popen(command.c_str(), "r");
+  if (pipe == nullptr) return output;
+  char buffer[256];
+  while (std::fgets(buffer, sizeof buffer, pipe) != nullptr) output += buffer;
+  ::pclose(pipe);
+  return output;
+}
+
+std::string ArtefactPath(const std::string& name) {
+  const std::string dir = ARCHWAY_ARTEFACTS_DIR;
+  (void)std::system(("mkdir -p '" + dir + "'").c_str());
+  return dir + "/" + name;
+}
+
+struct Rect {
+  int left = 0, top = 0, right = 0, bottom = 0;
+  int Width() const { return right - left; }
+  int Height() const { return bottom - top; }
+};
+
+bool IsPaneGrey(const HostDocument& shot, std::size_t at) {
+  return shot.Plane8(0)[at] == kPaneGrey && shot.Plane8(1)[at] == kPaneGrey &&
+         shot.Plane8(2)[at] == kPaneGrey;
+}
+
+// The preview pane is the box of its long runs of grey (a control's
+// border may be grey too, but only for a few pixels); the picture is what
+// is not grey inside it.
+bool FindPicture(const HostDocument& shot, Rect& pane, Rect& picture, Rect& shown) {
+  constexpr int kLongRun = 40;
+  pane = {shot.Width(), shot.Height(), 0, 0};
+  for (int y = 0; y < shot.Height(); ++y) {
+    int run = 0;
+    for (int x = 0; x <= shot.Width(); ++x) {
+      if (x < shot.Width() && IsPaneGrey(shot, std::size_t(y) * shot.Width() + x)) {
+        ++run;
+        continue;
+      }
+      if (run >= kLongRun) {
+        pane = {std::min(pane.left, x - run), std::min(pane.top, y), std::max(pane.right, x),
+                std::max(pane.bottom, y + 1)};
+      }
+      run = 0;
+    }
+  }
+  if (pane.Width() < 100 || pane.Height() < 100) return false;
+  shown = {pane.right, pane.bottom, pane.left, pane.top};
+  for (int y = pane.top + 2; y < pane.bottom - 2; ++y) {
+    for (int x = pane.left + 2; x < pane.right - 2; ++x) {
+      if (IsPaneGrey(shot, std::size_t(y) * shot.Width() + x)) continue;
+      shown = {std::min(shown.left, x), std::min(shown.top, y), std::max(shown.right, x + 1),
+               std::max(shown.bottom, y + 1)};
+    }
+  }
+  if (shown.Width() <= 50 || shown.Height() <= 50) return false;
+  // The picture fitted in the pane less 3 pixels a side, centred: where the
+  // result is transparent the pane's grey shows, so the picture is larger
+  // than what is not grey, which must lie inside it.
+  const double zoom =
+      std::min(double(pane.Width() - 6) / kPhotoWidth, double(pane.Height() - 6) / kPhotoHeight);
+  const int width = int(std::lround(kPhotoWidth * zoom));
+  const int height = int(std::lround(kPhotoHeight * zoom));
+  picture = {pane.left + (pane.Width() - width) / 2, pane.top + (pane.Height() - height) / 2, 0, 0};
+  picture.right = picture.left + width;
+  picture.bottom = picture.top + height;
+  // The tiles are drawn scaled, rounded outwards and smoothed: their edge
+  // may spill two pixels.
+  return shown.left >= picture.left - 2 && shown.right <= picture.right + 2 &&
+         shown.top >= picture.top - 2 && shown.bottom <= picture.bottom + 2;
+}
+
+class Edit : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    const std::string synth = ARCHWAY_SYNTH;
+    ASSERT_EQ(
+        std::system((synth + " --scene room --projection fisheye-equisolid --focal-mm 10 --size " +
+                     std::to_string(kPhotoWidth) + "x" + std::to_string(kPhotoHeight) + " -o " +
+                     folder_.File("room.tif") + " --action " + folder_.File("room.action") +
+                     " >/dev/null")
+                        .c_str()),
+        0);
+    input_ = ReadBytes(folder_.File("room.tif"));
+  }
+
+  void Open(const std::vector<std::string>& extra) {
+    std::vector<std::string> arguments = {"edit", "--action", folder_.File("room.action"), "-o",
+                                          folder_.File("edited.tif")};
+    arguments.insert(arguments.end(), extra.begin(), extra.end());
+    arguments.push_back(folder_.File("room.tif"));
+    run_ = std::make_unique<ProgramRun>(arguments, Environment{});
+    const auto deadline = std::chrono::steady_clock::now() + kOpening;
+    while (window_.empty() && std::chrono::steady_clock::now() < deadline) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(200));
+      window_ = Trimmed(Shell("xdotool search --name '^Archway' 2>/dev/null | head -1"));
+    }
+  }
+
+  static std::string Trimmed(std::string text) {
+    while (!text.empty() && (text.back() == '\n' || text.back() == ' ')) text.pop_back();
+    return text;
+  }
+
+  std::string Title() { return Trimmed(Shell("xdotool getwindowname " + window_)); }
+
+  // The window once it stopped changing (two grabs alike), kept as an
+  // artefact.
+  std::unique_ptr<HostDocument> Settled(const std::string& artefact) {
+    std::unique_ptr<HostDocument> last;
+    const auto deadline = std::chrono::steady_clock::now() + kOpening;
+    while (std::chrono::steady_clock::now() < deadline) {
+      std::this_thread::sleep_for(std::chrono::milliseconds(500));
+      std::unique_ptr<HostDocument> shot = GrabWindow(std::stoul(window_));
+      if (shot == nullptr) continue;
+      const bool same =
+          last != nullptr && last->Width() == shot->Width() && last->Height() == shot->Height() &&
+          std::equal(last->Plane8(0).begin(), last->Plane8(0).end(), shot->Plane8(0).begin()) &&
+          std::equal(last->Plane8(1).begin(), last->Plane8(1).end(), shot->Plane8(1).begin());
+      if (same) {
+        ImageFile::Write(*shot, ArtefactPath(artefact), FileFormat::kPng);
+        return shot;
+      }
+      last = std::move(shot);
+    }
+    if (last != nullptr)
+      ImageFile::Write(*last, ArtefactPath("unsettled-" + artefact), FileFormat::kPng);
+    return last;
+  }
+
+  // xdotool with the window focused first: there is no window manager.
+  int Xdo(const std::string& arguments) {
+    return std::system(
+        ("xdotool windowfocus " + window_ + " " + arguments + " >/dev/null 2>&1").c_str());
+  }
+
+  // A point of the window in screen coordinates.
+  std::string At(int x, int y) {
+    const std::string geometry = Shell("xdotool getwindowgeometry --shell " + window_);
+    int left = 0, top = 0;
+    std::sscanf(geometry.c_str() + geometry.find("X="), "X=%d", &left);
+    std::sscanf(geometry.c_str() + geometry.find("Y="), "Y=%d", &top);
+    return std::to_string(left + x) + " " + std::to_string(top + y);
+  }
+
+  // The program's end: the exit status, and the input as it was.
+  Finished End() {
+    const Finished finished = run_->Finish();
+    EXPECT_EQ(ReadBytes(folder_.File("room.tif")), input_) << "the input was touched";
+    return finished;
+  }
+
+  ScratchFolder folder_;
+  std::string input_;
+  std::unique_ptr<ProgramRun> run_;
+  std::string window_;
+};
+
+// The share of colour samples where shot's picture and the reference,
+// reduced to the picture's size by the box average, differ by more than
+// 24 levels; pixels where the pane's grey shows (no result) are left out.
+double DifferingShare(const HostDocument& shot, const Rect& picture, const HostDocument& reference,
+                      const std::string& artefact) {
+  const double sx = double(reference.Width()) / picture.Width();
+  const double sy = double(reference.Height()) / picture.Height();
+  std::size_t compared = 0, differing = 0;
+  std::unique_ptr<HostDocument> reduced =
+      HostDocument::Create(picture.Width(), picture.Height(), ImageMode::kRgb);
+  for (int y = 0; y < picture.Height(); ++y) {
+    for (int x = 0; x < picture.Width(); ++x) {
+      const std::size_t at = std::size_t(picture.top + y) * shot.Width() + picture.left + x;
+      const int x0 = int(x * sx), x1 = std::max(x0 + 1, int((x + 1) * sx));
+      const int y0 = int(y * sy), y1 = std::max(y0 + 1, int((y + 1) * sy));
+      for (int c = 0; c < 3; ++c) {
+        double sum = 0;
+        for (int v = y0; v < y1; ++v)
+          for (int u = x0; u < x1; ++u)
+            sum += reference.Plane8(c)[std::size_t(v) * reference.Width() + u];
+        const double mean = sum / ((x1 - x0) * (y1 - y0));
+        reduced->Plane8(c)[std::size_t(y) * picture.Width() + x] = std::uint8_t(mean + 0.5);
+        if (IsPaneGrey(shot, at)) continue;
+        ++compared;
+        // The preview reduces the source before the warp, the reference
+        // after it: edges differ by a blur's worth, flat areas agree.
+        if (std::abs(mean - shot.Plane8(c)[at]) > 24) ++differing;
+      }
+    }
+  }
+  ImageFile::Write(*reduced, ArtefactPath(artefact), FileFormat::kPng);
+  return compared == 0 ? 1.0 : double(differing) / double(compared);
+}
+
+TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
+  Open({});
+  ASSERT_FALSE(window_.empty()) << "no workspace window";
+  std::unique_ptr<HostDocument> shot = Settled("edit-opened.png");
+  ASSERT_NE(shot, nullptr);
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*shot, pane, picture, shown))
+      << "pane " << pane.left << " " << pane.top << " " << pane.right << " " << pane.bottom
+      << ", picture " << picture.left << " " << picture.top << " " << picture.right << " "
+      << picture.bottom << ", shown " << shown.left << " " << shown.top << " " << shown.right << " "
+      << shown.bottom;
+  EXPECT_NE(Title().find("room.tif @ "), std::string::npos) << Title();
+
+  ASSERT_EQ(RunToEnd({"apply", "--action", folder_.File("room.action"), "-o",
+                      folder_.File("applied.tif"), folder_.File("room.tif")})
+                .status,
+            0);
+  std::unique_ptr<HostDocument> applied = ImageFile::Read(folder_.File("applied.tif"));
+  // Line edges and the picture's border take a few per cent.
+  EXPECT_LT(DifferingShare(*shot, picture, *applied, "edit-applied-reduced.png"), 0.05);
+
+  ASSERT_EQ(Xdo("key Escape"), 0);
+  const Finished finished = End();
+  EXPECT_EQ(finished.status, 0) << finished.errors;
+  EXPECT_NE(finished.errors.find("closed without correcting it"), std::string::npos) << finished.errors;
+  EXPECT_EQ(folder_.Listing().find("edited"), std::string::npos);
+}
+
+TEST_F(Edit, ClosingTheWindowIsCancel) {
+  Open({});
+  ASSERT_FALSE(window_.empty());
+  ASSERT_NE(Settled("edit-closing.png"), nullptr);
+  ASSERT_TRUE(RequestClose(std::stoul(window_)));
+  const Finished finished = End();
+  EXPECT_EQ(finished.status, 0) << finished.errors;
+  EXPECT_EQ(folder_.Listing().find("edited"), std::string::npos);
+}
+
+TEST_F(Edit, OkWritesWhatTheStoredActionReplays) {
+  Open({"--save-action", folder_.File("saved.action")});
+  ASSERT_FALSE(window_.empty());
+  ASSERT_NE(Settled("edit-ok.png"), nullptr);
+  ASSERT_EQ(Xdo("key Return"), 0);
+  const Finished finished = End();
+  ASSERT_EQ(finished.status, 0) << finished.errors;
+  ASSERT_EQ(RunToEnd({"apply", "--action", folder_.File("saved.action"), "-o",
+                      folder_.File("replayed.tif"), folder_.File("room.tif")})
+                .status,
+            0);
+  std::unique_ptr<HostDocument> edited = ImageFile::Read(folder_.File("edited.tif"));
+  std::unique_ptr<HostDocument> replayed = ImageFile::Read(folder_.File("replayed.tif"));
+  ASSERT_EQ(edited->PlaneCount(), replayed->PlaneCount());
+  for (int p = 0; p < edited->PlaneCount(); ++p) {
+    EXPECT_TRUE(std::ranges::equal(edited->Plane8(p), replayed->Plane8(p))) << "plane " << p;
+  }
+}
+
+#endif  // ARCHWAY_REAL_MODULE
+
+}  // namespace
+}  // namespace Host::testing
