@@ -8,6 +8,7 @@
 #include "filter/PResult.h"
 #include "filter/PSource.h"
 #include "filter/PSourceScaled.h"
+#include "framework/pixels/CBasicPixmap.h"
 #include "framework/pixels/CMemoryPixmap.h"
 #include "framework/plugin/CQuillmarkFilter.h"
 #include "params/PSettings.h"
@@ -17,21 +18,6 @@ namespace Project {
 namespace {
 
 constexpr std::int32_t kTile = 128;
-
-// Gray and RGB as they are; CMYK by the plain complement.
-void DisplayColours(const std::uint8_t* planar, std::uint32_t planes, std::size_t count,
-                    std::uint8_t* rgb) {
-  for (std::size_t i = 0; i < count; ++i) {
-    for (std::uint32_t c = 0; c < 3; ++c) {
-      std::uint32_t v = planar[count * std::min(c, planes - 1) + i];
-      if (planes == 4) {
-        const std::uint32_t k = planar[count * 3 + i];
-        v = (255 - v) * (255 - k) / 255;
-      }
-      rgb[i * 3 + c] = std::uint8_t(v);
-    }
-  }
-}
 
 }  // namespace
 
@@ -138,14 +124,19 @@ void PPreview::ToDisplay(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area,
       }
     }
   }
-  colors_.resize(count * 3);
-  DisplayColours(samples_.data(), colorPlanes, count, colors_.data());
-  for (std::size_t i = 0; i < count; ++i) {
-    rgba[i * 4 + 0] = colors_[i * 3 + 0];
-    rgba[i * 4 + 1] = colors_[i * 3 + 1];
-    rgba[i * 4 + 2] = colors_[i * 3 + 2];
-    rgba[i * 4 + 3] = alpha[i];
-  }
+  // The host turns the document's colours into the display's, straight
+  // into the RGBA rows; the transparency goes in beside them.
+  std::vector<std::uint8_t*> planeOrigins;
+  for (std::uint32_t p = 0; p < colorPlanes; ++p)
+    planeOrigins.push_back(samples_.data() + count * p);
+  const Tarsa::CRect bounds{0, 0, std::int32_t(width), std::int32_t(height)};
+  const Tarsa::CBasicPixmap source(bounds, 8, std::move(planeOrigins), width, 1);
+  Tarsa::CBasicPixmap destination(bounds, 8, {rgba, rgba + 1, rgba + 2, rgba + 3},
+                                  std::size_t(width) * 4, 4);
+  const Tarsa::HostFilterRecord* record = run_.RenderHost().FilterRecord();
+  run_.RenderHost().ConvertToDisplay(record != nullptr ? record->imageMode : 0, source, bounds,
+                                     destination, {0, 0});
+  for (std::size_t i = 0; i < count; ++i) rgba[i * 4 + 3] = alpha[i];
 }
 
 void PPreview::ReadDetail(const Tarsa::CRect& area, bool source, std::vector<std::uint8_t>& rgba) {

@@ -64,7 +64,6 @@ class PPreview : public Tarsa::CPixProcess {
   bool scaled_ = false;
   std::vector<std::vector<std::uint8_t>> tiles_;
   std::vector<std::uint8_t> samples_;
-  std::vector<std::uint8_t> colors_;
 };
 
 }  // namespace Project

@@ -3,7 +3,7 @@ tool_size = 30;
 option_width = 300;
 slider_label = 90;
 slider_field = 84;
-PDialog(view_id: 'Project/Dialog', window_title: '$$$/Archway/Dialog/Title=Archway',
+PDialog(view_id: 'Project/Dialog', window_title: '$$$/Archway/Dialog/Title=Archway (^0 @ ^1%)',
         placement: place_row, margin: 10, spacing: 10, child_vertical: align_fill) {
   text_font = kFont_UIMedium;
   label_font = kFont_UIMedium;

@@ -6,6 +6,10 @@
 #include "filter/PImageHub.h"
 #include "filter/PPreview.h"
 #include "framework/view/CPort.h"
+#include "params/PSettings.h"
+#include "solver/constraints/ConstraintList.h"
+#include "workspace/ConstraintPainter.h"
+#include "workspace/MeshPainter.h"
 
 namespace Project {
 
@@ -74,6 +78,16 @@ void PDetailedPreviewPane::Draw(Tarsa::CPort& port) {
       std::int32_t(area.Width()) * 4,
       Tarsa::CRect{frame.left + dx, frame.top + dy, frame.left + dx + std::int32_t(area.Width()),
                    frame.top + dy + std::int32_t(area.Height())});
+  // The constraints, then the mesh, at 100 % over the picture.
+  const PSettings& settings = filter_->Settings();
+  ConstraintList& list = filter_->Constraints();
+  const ScreenTransform screen{1.0f, float(frame.left + dx - area.left),
+                               float(frame.top + dy - area.top), 0.0f, 0.0f};
+  port.Save();
+  port.Clip(frame);
+  if (settings.constraintsVisible != 0) ConstraintPainter(list, screen).Draw(port, false);
+  if (settings.meshVisible != 0) DrawMesh(list.Env(), port, screen, settings.colorMesh);
+  port.Restore();
   // The cross at the centre: white bars with black strokes on the arms.
   const double x = frame.left + width / 2 + 0.5, y = frame.top + height / 2 + 0.5;
   port.Line({x - 3, y}, {x + 3, y}, kWhite);

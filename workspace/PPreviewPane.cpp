@@ -12,6 +12,10 @@
 #include "framework/view/CMouseMessage.h"
 #include "framework/view/CPort.h"
 #include "framework/view/CWindow.h"
+#include "params/PSettings.h"
+#include "solver/constraints/ConstraintList.h"
+#include "workspace/ConstraintPainter.h"
+#include "workspace/MeshPainter.h"
 #include "workspace/PDetailedPreviewPane.h"
 
 namespace Project {
@@ -24,8 +28,9 @@ constexpr std::uint32_t kBackground = 0xFF808080;
 
 }  // namespace
 
-PPreviewPane::PPreviewPane(Tarsa::CObjID id, Tarsa::CView* parent, const Tarsa::CRect& frame)
-    : Tarsa::CZoomPane(id, parent, frame, Tarsa::kView_NoOptions, Tarsa::kBind_Sizeable) {}
+PPreviewPane::PPreviewPane(Tarsa::CObjID id, Tarsa::CView* parent, const Tarsa::CRect& frame,
+                           std::uint32_t options, std::uint32_t binding)
+    : Tarsa::CZoomPane(id, parent, frame, options, binding) {}
 
 PPreviewPane::~PPreviewPane() {
   if (filter_ != nullptr && filter_->HasImageHub()) filter_->ImageHub().ConnectPane(nullptr);
@@ -130,7 +135,15 @@ void PPreviewPane::DrawTiles(Tarsa::CPort& port) {
   }
 }
 
-void PPreviewPane::DrawOverlays(Tarsa::CPort& /*port*/) {}
+void PPreviewPane::DrawOverlays(Tarsa::CPort& port) { DrawOverlays(port, Scale(), 0.0, 0.0); }
+
+void PPreviewPane::DrawOverlays(Tarsa::CPort& port, double scale, double originX, double originY) {
+  const PSettings& settings = filter_->Settings();
+  ConstraintList& list = filter_->Constraints();
+  const ScreenTransform screen{float(scale), float(originX), float(originY), 0.0f, 0.0f};
+  if (settings.meshVisible != 0) DrawMesh(list.Env(), port, screen, settings.colorMesh);
+  if (settings.constraintsVisible != 0) ConstraintPainter(list, screen).Draw(port, false);
+}
 
 bool PPreviewPane::LoupeShown() const {
   return (showDragLoupe_ || showKeyLoupe_) && Zoom() < 1.0 && mouseInside_;
@@ -161,6 +174,11 @@ void PPreviewPane::DrawLoupe(Tarsa::CPort& port) {
   filter_->ImageHub().Preview().ReadDetail(area, showSource_, loupePixels_);
   port.FillRect(square, kBackground);
   port.DrawImage(loupePixels_.data(), size, size, size * 4, square);
+  // The constraints at 100 % over it, cut to the square.
+  port.Save();
+  port.Clip(square);
+  DrawOverlays(port, 1.0, square.left - area.left, square.top - area.top);
+  port.Restore();
   port.FrameRect(square, 0xFF000000);
   // The drop shadow, under and right of the square.
   port.FillRect({square.left + 4, square.bottom, square.right + 3, square.bottom + 3}, 0x66000000);

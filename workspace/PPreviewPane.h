@@ -21,7 +21,9 @@ class PFilter;
 // destructor, before the hub's updates could reach a pane that is gone.
 class PPreviewPane : public Tarsa::CZoomPane, public PPreviewTarget {
  public:
-  PPreviewPane(Tarsa::CObjID id, Tarsa::CView* parent, const Tarsa::CRect& frame);
+  PPreviewPane(Tarsa::CObjID id, Tarsa::CView* parent, const Tarsa::CRect& frame,
+               std::uint32_t options = Tarsa::kView_NoOptions,
+               std::uint32_t binding = Tarsa::kBind_Sizeable);
   ~PPreviewPane() override;
 
   void Attach(PFilter& filter);
@@ -64,6 +66,8 @@ class PPreviewPane : public Tarsa::CZoomPane, public PPreviewTarget {
   void UpdateDisplay();
   void DrawTiles(Tarsa::CPort& port);
   void DrawOverlays(Tarsa::CPort& port);
+  // The mesh and the constraints with view = image x scale + origin.
+  void DrawOverlays(Tarsa::CPort& port, double scale, double originX, double originY);
   void DrawLoupe(Tarsa::CPort& port);
 
   PFilter* filter_ = nullptr;
