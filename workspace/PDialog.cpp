@@ -371,6 +371,18 @@ void PDialog::HandleMessage(Tarsa::CMessage& message) {
       message.SetHandled();
       return;
     }
+    // Return in a number field or a popup ends the edit there, rather than
+    // pressing OK: the focus goes back to the picture.
+    const auto* key = dynamic_cast<const Tarsa::CValMsg<std::uint32_t>*>(&message);
+    Tarsa::CMessenger* focus = Tarsa::CMessenger::Target();
+    if (name == names.keyDown && key != nullptr && key->value == Tarsa::kKey_Return &&
+        (dynamic_cast<Tarsa::CEditNumber*>(focus) != nullptr ||
+         dynamic_cast<Tarsa::CRadioPopup*>(focus) != nullptr) &&
+        preview_ != nullptr) {
+      preview_->BecomeTarget(true);
+      message.SetHandled();
+      return;
+    }
   }
   if (name == Tarsa::CZoomPane::ZoomChangedName()) {
     UpdateTitle();

@@ -238,6 +238,7 @@ void PPreviewPane::MouseDown(Tarsa::CMouseMessage& message) {
   event.y = message.where.y;
   event.time = message.time;
   event.modifiers = message.modifiers;
+  event.button = Tarsa::CMouseEvent::ButtonOf(message.button);
   Tarsa::CPanner panner(this, Tarsa::CPanner::kAxisX | Tarsa::CPanner::kAxisY);
   panner.RunPan(event);
   message.SetHandled();

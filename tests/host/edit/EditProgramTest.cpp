@@ -13,14 +13,19 @@
 #include <thread>
 #include <vector>
 
+#include "framework/plugin/HostSuites.h"
+#include "host/actions/ActionFile.h"
 #include "host/io/HostDocument.h"
 #include "host/io/ImageFile.h"
+#include "params/ConstraintBlob.h"
 #include "tests/host/app/ProgramRun.h"
 #include "tests/support/ScreenGrab.h"
 #include "tests/support/TestSupport.h"
 
 namespace Host::testing {
 namespace {
+
+using Tarsa::FourCC;
 
 #ifdef ARCHWAY_REAL_MODULE
 
@@ -63,7 +68,8 @@ bool IsPaneGrey(const HostDocument& shot, std::size_t at) {
 // The preview pane is the box of its long runs of grey (a control's
 // border may be grey too, but only for a few pixels); the picture is what
 // is not grey inside it.
-bool FindPicture(const HostDocument& shot, Rect& pane, Rect& picture, Rect& shown) {
+bool FindPicture(const HostDocument& shot, Rect& pane, Rect& picture, Rect& shown,
+                 double zoom = 0) {
   constexpr int kLongRun = 40;
   pane = {shot.Width(), shot.Height(), 0, 0};
   for (int y = 0; y < shot.Height(); ++y) {
@@ -90,11 +96,13 @@ bool FindPicture(const HostDocument& shot, Rect& pane, Rect& picture, Rect& show
     }
   }
   if (shown.Width() <= 50 || shown.Height() <= 50) return false;
-  // The picture fitted in the pane less 3 pixels a side, centred: where the
-  // result is transparent the pane's grey shows, so the picture is larger
-  // than what is not grey, which must lie inside it.
-  const double zoom =
-      std::min(double(pane.Width() - 6) / kPhotoWidth, double(pane.Height() - 6) / kPhotoHeight);
+  // The picture at the zoom, or else fitted in the pane less 3 pixels a
+  // side, centred: where the result is transparent the pane's grey shows,
+  // so the picture is larger than what is not grey, which must lie inside.
+  if (zoom <= 0) {
+    zoom =
+        std::min(double(pane.Width() - 6) / kPhotoWidth, double(pane.Height() - 6) / kPhotoHeight);
+  }
   const int width = int(std::lround(kPhotoWidth * zoom));
   const int height = int(std::lround(kPhotoHeight * zoom));
   picture = {pane.left + (pane.Width() - width) / 2, pane.top + (pane.Height() - height) / 2, 0, 0};
@@ -226,6 +234,70 @@ double DifferingShare(const HostDocument& shot, const Rect& picture, const HostD
   return compared == 0 ? 1.0 : double(differing) / double(compared);
 }
 
+std::uint32_t Rgb(const HostDocument& shot, int x, int y) {
+  const std::size_t at = std::size_t(y) * shot.Width() + x;
+  return (std::uint32_t(shot.Plane8(0)[at]) << 16) | (std::uint32_t(shot.Plane8(1)[at]) << 8) |
+         shot.Plane8(2)[at];
+}
+
+// Whether a pixel within radius of (x, y) has the colour, each channel
+// within tolerance.
+bool ColourNear(const HostDocument& shot, double x, double y, int radius, std::uint32_t colour,
+                int tolerance) {
+  for (int v = int(y) - radius; v <= int(y) + radius; ++v) {
+    for (int u = int(x) - radius; u <= int(x) + radius; ++u) {
+      if (u < 0 || v < 0 || u >= shot.Width() || v >= shot.Height()) continue;
+      const std::uint32_t c = Rgb(shot, u, v);
+      bool near = true;
+      for (int shift : {16, 8, 0})
+        near &= std::abs(int((c >> shift) & 0xFF) - int((colour >> shift) & 0xFF)) <= tolerance;
+      if (near) return true;
+    }
+  }
+  return false;
+}
+
+// The share of pixels of the block (x, y, size) of a that b shows moved by
+// (dx, dy) within 3 levels; the best over small offsets, since a centre
+// rounds either way.
+double Agreement(const HostDocument& a, int x, int y, int size, const HostDocument& b, int dx,
+                 int dy, int slack = 0) {
+  double best = 0;
+  for (int oy = -slack; oy <= slack; ++oy) {
+    for (int ox = -slack; ox <= slack; ++ox) {
+      std::size_t agree = 0, all = 0;
+      for (int v = y; v < y + size; ++v) {
+        for (int u = x; u < x + size; ++u) {
+          const int bu = u + dx + ox, bv = v + dy + oy;
+          if (bu < 0 || bv < 0 || bu >= b.Width() || bv >= b.Height()) continue;
+          ++all;
+          bool same = true;
+          for (int c = 0; c < 3; ++c) {
+            same &= std::abs(int(a.Plane8(c)[std::size_t(v) * a.Width() + u]) -
+                             int(b.Plane8(c)[std::size_t(bv) * b.Width() + bu])) <= 3;
+          }
+          agree += same ? 1 : 0;
+        }
+      }
+      if (all > 0) best = std::max(best, double(agree) / double(all));
+    }
+  }
+  return best;
+}
+
+// Where the option column's controls are: the layout file binds the column
+// to the window's top right, so they keep these offsets from the right edge
+// and the top at any window size.
+constexpr int kFocalFieldFromRight = 68;
+constexpr int kFocalFieldTop = 241;
+constexpr int kModelPopupFromRight = 189;
+constexpr int kModelPopupTop = 172;
+
+double TitleZoom(const std::string& title) {
+  const std::size_t at = title.find(" @ ");
+  return at == std::string::npos ? 0.0 : std::atof(title.c_str() + at + 3);
+}
+
 TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
   Open({});
   ASSERT_FALSE(window_.empty()) << "no workspace window";
@@ -250,7 +322,8 @@ TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
   ASSERT_EQ(Xdo("key Escape"), 0);
   const Finished finished = End();
   EXPECT_EQ(finished.status, 0) << finished.errors;
-  EXPECT_NE(finished.errors.find("closed without correcting it"), std::string::npos) << finished.errors;
+  EXPECT_NE(finished.errors.find("closed without correcting it"), std::string::npos)
+      << finished.errors;
   EXPECT_EQ(folder_.Listing().find("edited"), std::string::npos);
 }
 
@@ -281,6 +354,166 @@ TEST_F(Edit, OkWritesWhatTheStoredActionReplays) {
   for (int p = 0; p < edited->PlaneCount(); ++p) {
     EXPECT_TRUE(std::ranges::equal(edited->Plane8(p), replayed->Plane8(p))) << "plane " << p;
   }
+}
+
+TEST_F(Edit, ConstraintsAreDrawnInTheirColoursWhereTheyLie) {
+  Open({});
+  ASSERT_FALSE(window_.empty());
+  ASSERT_NE(Settled("edit-constraints-result.png"), nullptr);
+  // With Preview off the picture is the photograph, where each line's
+  // traced curve runs from its first point to its last.
+  ASSERT_EQ(Xdo("key p"), 0);
+  std::unique_ptr<HostDocument> shot = Settled("edit-constraints-source.png");
+  ASSERT_NE(shot, nullptr);
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*shot, pane, picture, shown));
+  const double scale = double(picture.Width()) / kPhotoWidth;
+
+  const Descriptor action = ActionFile::Read(folder_.File("room.action"));
+  const Descriptor::Item* blob = action.Find(FourCC("cnsD"));
+  ASSERT_NE(blob, nullptr);
+  const std::vector<Project::BlobRecord> records =
+      Project::ConstraintBlob::Decode(blob->data.data(), blob->data.size());
+  // The settings' default colours by orientation: unfixed, horizontal,
+  // vertical, fixed.
+  const std::uint32_t colours[] = {0x4AFFFF, 0xFFFF4A, 0xFF4AFF, 0x4AFF4A};
+  int lines = 0, found = 0;
+  for (const Project::BlobRecord& record : records) {
+    const auto* line = std::get_if<Project::BlobLine>(&record);
+    if (line == nullptr || line->kind < 1 || line->kind > 4) continue;
+    ++lines;
+    const std::uint32_t colour = colours[line->kind - 1];
+    // Anti-aliasing over the photograph softens a 1-pixel line's colour.
+    const bool first = ColourNear(*shot, picture.left + line->x0 * scale,
+                                  picture.top + line->y0 * scale, 2, colour, 60);
+    const bool last = ColourNear(*shot, picture.left + line->x1 * scale,
+                                 picture.top + line->y1 * scale, 2, colour, 60);
+    found += first && last ? 1 : 0;
+  }
+  ASSERT_GT(lines, 3);
+  // Where lines meet at a corner of the room the one drawn later covers the
+  // other's end.
+  EXPECT_GE(found, lines - lines / 10) << found << " of " << lines;
+  Xdo("key Escape");
+  End();
+}
+
+TEST_F(Edit, ZoomScrollAndLoupeShowThePictureWhereExpected) {
+  Open({});
+  ASSERT_FALSE(window_.empty());
+  std::unique_ptr<HostDocument> opened = Settled("edit-zoom-fit.png");
+  ASSERT_NE(opened, nullptr);
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*opened, pane, picture, shown));
+  EXPECT_NEAR(TitleZoom(Title()), 100.0 * picture.Width() / kPhotoWidth, 0.1);
+  ASSERT_EQ(RunToEnd({"apply", "--action", folder_.File("room.action"), "-o",
+                      folder_.File("applied.tif"), folder_.File("room.tif")})
+                .status,
+            0);
+  std::unique_ptr<HostDocument> applied = ImageFile::Read(folder_.File("applied.tif"));
+
+  // 100 % typed into the zoom field: about the pane's centre, the picture
+  // is the final rendering pixel for pixel.
+  const std::string field = At(pane.left + 25, pane.bottom + 9);
+  ASSERT_EQ(Xdo("mousemove " + field + " click 1 type 100"), 0);
+  ASSERT_EQ(Xdo("key Return"), 0);
+  std::unique_ptr<HostDocument> actual = Settled("edit-zoom-100.png");
+  ASSERT_NE(actual, nullptr);
+  EXPECT_NEAR(TitleZoom(Title()), 100.0, 1e-9);
+  const int cx = (pane.left + pane.right) / 2, cy = (pane.top + pane.bottom) / 2;
+  // The constraints drawn over the picture take a few per cent.
+  EXPECT_GT(Agreement(*actual, cx - 100, cy - 100, 200, *applied, kPhotoWidth / 2 - cx,
+                      kPhotoHeight / 2 - cy, 2),
+            0.95);
+
+  // A drag moves the picture with the hand; the wheel scrolls 36 pixels a
+  // notch.
+  ASSERT_EQ(
+      Xdo("mousemove " + At(cx, cy) + " mousedown 1 sleep 0.2 mousemove " + At(cx - 40, cy - 25) +
+          " sleep 0.2 mousemove " + At(cx - 80, cy - 50) + " sleep 0.2 mouseup 1"),
+      0);
+  std::unique_ptr<HostDocument> dragged = Settled("edit-zoom-dragged.png");
+  ASSERT_NE(dragged, nullptr);
+  EXPECT_GT(Agreement(*dragged, cx - 150, cy - 100, 150, *actual, 80, 50), 0.98);
+  ASSERT_EQ(Xdo("mousemove " + At(cx, cy) + " click 5 click 5"), 0);
+  std::unique_ptr<HostDocument> wheeled = Settled("edit-zoom-wheeled.png");
+  ASSERT_NE(wheeled, nullptr);
+  EXPECT_GT(Agreement(*wheeled, cx - 100, cy - 150, 150, *dragged, 0, 72), 0.98);
+
+  // Back below 100 %, Q shows the loupe: a framed square of 140 pixels
+  // about the mouse with the picture at 100 % in it.
+  ASSERT_EQ(Xdo("mousemove " + field + " click 1 type 25"), 0);
+  ASSERT_EQ(Xdo("key Return"), 0);
+  std::unique_ptr<HostDocument> quarter = Settled("edit-zoom-25.png");
+  ASSERT_NE(quarter, nullptr);
+  EXPECT_NEAR(TitleZoom(Title()), 25.0, 1e-9);
+  ASSERT_TRUE(FindPicture(*quarter, pane, picture, shown, 0.25));
+  const int mx = (picture.left + picture.right) / 2, my = (picture.top + picture.bottom) / 2;
+  ASSERT_EQ(Xdo("mousemove " + At(mx, my) + " keydown q"), 0);
+  std::unique_ptr<HostDocument> loupe = Settled("edit-loupe.png");
+  Xdo("keyup q");
+  ASSERT_NE(loupe, nullptr);
+  for (int t = -60; t <= 60; t += 20) {
+    EXPECT_EQ(Rgb(*loupe, mx - 70, my + t), 0u) << "the loupe's left edge at " << t;
+    EXPECT_EQ(Rgb(*loupe, mx + 69, my + t), 0u) << "the loupe's right edge at " << t;
+    EXPECT_EQ(Rgb(*loupe, mx + t, my - 70), 0u) << "the loupe's top edge at " << t;
+  }
+  const int ix = int((mx - picture.left) * 4.0), iy = int((my - picture.top) * 4.0);
+  EXPECT_GT(Agreement(*loupe, mx - 40, my - 40, 80, *applied, ix - mx, iy - my, 3), 0.95);
+  std::unique_ptr<HostDocument> released = Settled("edit-loupe-released.png");
+  ASSERT_NE(released, nullptr);
+  EXPECT_NE(Rgb(*released, mx - 70, my), 0u) << "the loupe stays after Q";
+  Xdo("key Escape");
+  End();
+}
+
+TEST_F(Edit, FocalLengthAndModelChangesSolveAgainAndRedraw) {
+  Open({"--save-action", folder_.File("saved.action")});
+  ASSERT_FALSE(window_.empty());
+  std::unique_ptr<HostDocument> opened = Settled("edit-focal-before.png");
+  ASSERT_NE(opened, nullptr);
+  const int right = opened->Width();
+  ASSERT_EQ(Xdo("mousemove " + At(right - kFocalFieldFromRight, kFocalFieldTop) +
+                " click 1 key End BackSpace BackSpace BackSpace BackSpace BackSpace BackSpace "
+                "type 20"),
+            0);
+  ASSERT_EQ(Xdo("key Return"), 0);
+  std::unique_ptr<HostDocument> refocused = Settled("edit-focal-20.png");
+  ASSERT_NE(refocused, nullptr);
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*refocused, pane, picture, shown));
+  EXPECT_LT(Agreement(*refocused, picture.left + 20, picture.top + 20, 150, *opened, 0, 0), 0.9)
+      << "the preview did not change";
+
+  // The model popup's next item: Perspective.
+  ASSERT_EQ(Xdo("mousemove " + At(right - kModelPopupFromRight, kModelPopupTop) + " click 1"), 0);
+  std::this_thread::sleep_for(std::chrono::milliseconds(300));
+  ASSERT_EQ(Xdo("key Down Return"), 0);
+  std::unique_ptr<HostDocument> perspective = Settled("edit-perspective.png");
+  ASSERT_NE(perspective, nullptr);
+  EXPECT_LT(Agreement(*perspective, picture.left + 20, picture.top + 20, 150, *refocused, 0, 0),
+            0.9)
+      << "the preview did not change";
+
+  // The first Return ends the popup's edit, the second presses OK.
+  ASSERT_EQ(Xdo("key Return"), 0);
+  ASSERT_EQ(Xdo("key Return"), 0);
+  const Finished finished = End();
+  ASSERT_EQ(finished.status, 0) << finished.errors;
+  const Descriptor saved = ActionFile::Read(folder_.File("saved.action"));
+  ASSERT_NE(saved.Find(FourCC("focL")), nullptr);
+  // 20 mm over a 36 mm frame across the 1200 pixels of the longer side.
+  EXPECT_NEAR(saved.Find(FourCC("focL"))->number, 20.0 * kPhotoWidth / 36.0, 0.5);
+  ASSERT_NE(saved.Find(FourCC("prjM")), nullptr);
+  EXPECT_EQ(saved.Find(FourCC("prjM"))->enumValue, FourCC("perP"));
+  // What the workspace showed last is what the stored action renders.
+  ASSERT_EQ(RunToEnd({"apply", "--action", folder_.File("saved.action"), "-o",
+                      folder_.File("replayed.tif"), folder_.File("room.tif")})
+                .status,
+            0);
+  EXPECT_LT(DifferingShare(*perspective, picture, *ImageFile::Read(folder_.File("replayed.tif")),
+                           "edit-perspective-applied-reduced.png"),
+            0.05);
 }
 
 #endif  // ARCHWAY_REAL_MODULE
