@@ -63,6 +63,8 @@
 
 namespace {
 
+using Project::bench::BenchHost;
+using Project::bench::FrameworkScope;
 using Project::bench::Median;
 using Project::bench::ResetPeak;
 using Project::bench::StatusKb;
@@ -79,23 +81,6 @@ constexpr int kPlanes = 3;
 double Since(Clock::time_point start) {
   return std::chrono::duration<double>(Clock::now() - start).count();
 }
-
-// The host, cancelling the first render at its first check: the scripted
-// run then leaves the solved mesh without spending a render on it.
-class BenchHost : public Tarsa::testing::RealHost {
- public:
-  using RealHost::RealHost;
-  bool cancelNext = true;
-
- private:
-  bool AbortRequested() override { return std::exchange(cancelNext, false); }
-};
-
-// The framework starts clean and is shut down after the scene.
-struct FrameworkScope {
-  FrameworkScope() { Tarsa::CPluginEntry::TearDown(); }
-  ~FrameworkScope() { Tarsa::CPluginEntry::TearDown(); }
-};
 
 // A picture's planes, each row after row.
 template <typename Sample>
