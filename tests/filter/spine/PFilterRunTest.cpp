@@ -6,13 +6,13 @@
 
 #include <gtest/gtest.h>
 
-#include "workspace/EntryFI.h"
 #include "filter/PFilter.h"
 #include "framework/native/NativeDisplay.h"
 #include "framework/plugin/CFrameworkServices.h"
 #include "tests/support/FilterFixture.h"
 #include "tests/support/MesaUnderSanitizers.h"
 #include "tests/support/RecordingPresenter.h"
+#include "workspace/EntryFI.h"
 
 // The driver has no frame pointers, so only the slow unwinder reaches the
 // EGL frame that the suppression names.
