@@ -82,17 +82,11 @@ int PPreview::Advance(std::int32_t col, std::int32_t row, std::uint32_t& stepCou
   std::vector<std::uint8_t>& tile = tiles_[std::size_t(row) * Columns() + col];
   tile.assign(std::size_t(kTile) * kTile * 4, 0);
   const Tarsa::CRect cell = TileRect({viewRect_.left, viewRect_.top}, col, row);
-  Tarsa::CMemoryPixmap copy(stageArea, pixels->Planes(), pixels->Depth());
-  copy.CopyFrom(*pixels, stageArea);
-  std::vector<std::uint8_t> rgba(std::size_t(area.Width()) * area.Height() * 4);
-  ToDisplay(copy, stageArea, rgba.data());
-  const std::size_t rowBytes = std::size_t(area.Width()) * 4;
-  for (std::int32_t y = 0; y < std::int32_t(area.Height()); ++y) {
-    std::copy_n(rgba.data() + std::size_t(y) * rowBytes, rowBytes,
-                tile.data() + (std::size_t(area.top - cell.top + y) * kTile +
-                               std::size_t(area.left - cell.left)) *
-                                  4);
-  }
+  DisplayInto(
+      *pixels, stageArea,
+      tile.data() +
+          (std::size_t(area.top - cell.top) * kTile + std::size_t(area.left - cell.left)) * 4,
+      kTile);
   SetCount(col, row, StepsOf(col, row));
   ++stepCount;
   if (target_ != nullptr) target_->PreviewChanged(area);
@@ -154,17 +148,22 @@ void PPreview::ReadDetail(const Tarsa::CRect& area, bool source, std::vector<std
     BringUpToDate(from, wanted, true, steps);
     pixels = from.Pixels();
   }
-  Tarsa::CMemoryPixmap copy(wanted, pixels->Planes(), pixels->Depth());
-  copy.CopyFrom(*pixels, wanted);
-  std::vector<std::uint8_t> part(std::size_t(wanted.Width()) * wanted.Height() * 4);
-  ToDisplay(copy, wanted, part.data());
-  const std::size_t rowBytes = std::size_t(wanted.Width()) * 4;
-  for (std::int32_t y = 0; y < std::int32_t(wanted.Height()); ++y) {
-    std::copy_n(part.data() + std::size_t(y) * rowBytes, rowBytes,
-                rgba.data() + (std::size_t(wanted.top - area.top + y) * area.Width() +
-                               std::size_t(wanted.left - area.left)) *
-                                  4);
-  }
+  DisplayInto(*pixels, wanted,
+              rgba.data() + (std::size_t(wanted.top - area.top) * area.Width() +
+                             std::size_t(wanted.left - area.left)) *
+                                4,
+              std::size_t(area.Width()));
+}
+
+void PPreview::DisplayInto(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area,
+                           std::uint8_t* rgba, std::size_t rowPixels) {
+  Tarsa::CMemoryPixmap copy(area, pixels.Planes(), pixels.Depth());
+  copy.CopyFrom(pixels, area);
+  std::vector<std::uint8_t> part(std::size_t(area.Width()) * area.Height() * 4);
+  ToDisplay(copy, area, part.data());
+  const std::size_t rowBytes = std::size_t(area.Width()) * 4;
+  for (std::int32_t y = 0; y < std::int32_t(area.Height()); ++y)
+    std::copy_n(part.data() + std::size_t(y) * rowBytes, rowBytes, rgba + y * rowPixels * 4);
 }
 
 void PPreview::Invalidate(const Tarsa::CRect& area) {

@@ -53,6 +53,10 @@ class PPreview : public Tarsa::CPixProcess {
   void ReadDetail(const Tarsa::CRect& area, bool source, std::vector<std::uint8_t>& rgba);
 
  private:
+  // Area of the stage's pixels in display colours into RGBA rows of
+  // rowPixels pixels, from rgba.
+  void DisplayInto(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area, std::uint8_t* rgba,
+                   std::size_t rowPixels);
   // Turns the colour planes and the transparency of area into RGBA.
   void ToDisplay(const Tarsa::CPixmap& pixels, const Tarsa::CRect& area, std::uint8_t* rgba);
 

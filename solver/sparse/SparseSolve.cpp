@@ -17,6 +17,25 @@ namespace {
 
 static_assert(sizeof(int) == sizeof(std::int32_t), "the orders are handed over as int");
 
+// A symmetric matrix as the library takes it: the lower triangle in
+// compressed columns, sorted and packed, borrowing the arrays.
+cholmod_sparse LowerTriangle(std::size_t size, std::size_t entries, int* columnStart, int* rowIndex,
+                             double* values) {
+  cholmod_sparse a{};
+  a.nrow = a.ncol = size;
+  a.nzmax = entries;
+  a.p = columnStart;
+  a.i = rowIndex;
+  a.x = values;
+  a.stype = -1;
+  a.itype = CHOLMOD_INT;
+  a.xtype = CHOLMOD_REAL;
+  a.dtype = CHOLMOD_DOUBLE;
+  a.sorted = true;
+  a.packed = true;
+  return a;
+}
+
 double SecondsSince(std::chrono::steady_clock::time_point start) {
   return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
 }
@@ -205,20 +224,10 @@ bool SparseSession::Solve(const CompressedMatrix& matrix, std::span<const double
     state.given = std::move(given);
   }
 
-  cholmod_sparse a{};
-  a.nrow = size;
-  a.ncol = size;
-  a.nzmax = static_cast<std::size_t>(entries);
-  a.p = state.columnStart.data();
-  a.i = state.rowIndex.data();
   // The library only reads the values and the right side.
-  a.x = const_cast<double*>(matrix.Value());
-  a.stype = -1;
-  a.itype = CHOLMOD_INT;
-  a.xtype = CHOLMOD_REAL;
-  a.dtype = CHOLMOD_DOUBLE;
-  a.sorted = true;
-  a.packed = true;
+  cholmod_sparse a =
+      LowerTriangle(size, static_cast<std::size_t>(entries), state.columnStart.data(),
+                    state.rowIndex.data(), const_cast<double*>(matrix.Value()));
 
   cholmod_dense b{};
   b.nrow = size;
@@ -354,18 +363,8 @@ bool OrderLeadingBlock(const CompressedMatrix& matrix, std::int32_t leading,
   cholmod_common common{};
   cholmod_start(&common);
   common.print = 0;
-  cholmod_sparse a{};
-  a.nrow = a.ncol = static_cast<std::size_t>(leading);
-  a.nzmax = rowIndex.size();
-  a.p = columnStart.data();
-  a.i = rowIndex.data();
-  a.x = values.data();
-  a.stype = -1;
-  a.itype = CHOLMOD_INT;
-  a.xtype = CHOLMOD_REAL;
-  a.dtype = CHOLMOD_DOUBLE;
-  a.sorted = true;
-  a.packed = true;
+  cholmod_sparse a = LowerTriangle(static_cast<std::size_t>(leading), rowIndex.size(),
+                                   columnStart.data(), rowIndex.data(), values.data());
   std::vector<int> order(static_cast<std::size_t>(leading)), parent(order.size()),
       member(order.size());
   const bool ordered = cholmod_nested_dissection(&a, nullptr, 0, order.data(), parent.data(),
