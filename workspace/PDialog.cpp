@@ -15,6 +15,7 @@
 #include "framework/controls/CStaticText.h"
 #include "framework/process/CKeyCodes.h"
 #include "framework/process/CMessageNames.h"
+#include "framework/process/CProcess.h"
 #include "framework/process/CValMsg.h"
 #include "framework/strings/CString.h"
 #include "params/PSettings.h"
@@ -29,6 +30,8 @@ namespace {
 constexpr const char* kTitleFormat = "$$$/Archway/Dialog/Title=Archway (^0 @ ^1%)";
 constexpr const char* kCameraLine = "$$$/Archway/Dialog/CameraEXIFInfo=Camera Model: ^0 (^1)";
 constexpr const char* kLensLine = "$$$/Archway/Dialog/LensEXIFInfo=Lens Model: ^0";
+constexpr const char* kCancelText = "$$$/Archway/Dialog/CancelButton=Cancel";
+constexpr const char* kResetText = "$$$/Archway/Dialog/ResetButton=Reset";
 constexpr const char* kSolveFailedText = "$$$/Archway/Warning/SolveFailed=Solve failed";
 constexpr const char* kProgressTitle = "$$$/Archway/Final/Progress/Title=Progress";
 constexpr const char* kProgressMessage = "$$$/Archway/Final/Progress/Message=Applying Archway.";
@@ -95,6 +98,11 @@ void PDialog::SetUpControls() {
   preview_ = Control<PPreviewPane>(kPreviewPane);
   detail_ = Control<PDetailedPreviewPane>(kDetailPane);
   UpdateFocalRange();
+  // The dialog decides when it closes: an OK whose rendering is cancelled,
+  // or a Cancel that resets, leaves it open.
+  for (const char* id : {kOkButton, kCancelButton}) {
+    if (auto* button = Control<Tarsa::CPushButton>(id)) button->SetEndsModal(false);
+  }
 
   // As shot: the photo's own focal length and crop factor, or its 35 mm
   // equivalent over the crop factor.
@@ -322,6 +330,7 @@ void PDialog::Cancel() {
 
 void PDialog::Reset() {
   PSettings& settings = filter_.Settings();
+  filter_.Constraints().RemoveAll();
   filter_.ResolveProjectionModel(PSettings::kModelFisheye, true, false);
   settings.focalLength = filter_.FocalFromMetadata(false);
   settings.imageScale = 120;
@@ -361,7 +370,21 @@ bool PDialog::HandleKey(const Tarsa::CMessage& message, bool down) {
   return true;
 }
 
-void PDialog::Poll() { ShowSolverInfo(filter_.SolveFailed(), Shown(kSolveFailedText)); }
+void PDialog::Poll() {
+  // Alt held turns Cancel into Reset, read from the keyboard as it is now:
+  // holding a modifier sends nothing.
+  if (Tarsa::CProcess* process = Tarsa::CProcess::Current()) {
+    const bool alt = (process->EventSource().Modifiers() & Tarsa::kModifier_Alt) != 0;
+    if (alt != resetMode_) {
+      resetMode_ = alt;
+      if (auto* cancel = Control<Tarsa::CPushButton>(kCancelButton)) {
+        cancel->SetLabel(Shown(alt ? kResetText : kCancelText));
+        cancel->Invalidate();
+      }
+    }
+  }
+  ShowSolverInfo(filter_.SolveFailed(), Shown(kSolveFailedText));
+}
 
 void PDialog::HandleMessage(Tarsa::CMessage& message) {
   const Tarsa::CMessageNames& names = Tarsa::CMessageNames::Get();
@@ -424,8 +447,7 @@ void PDialog::HandleMessage(Tarsa::CMessage& message) {
   } else if (name == Id(kOkButton)) {
     Ok();
   } else if (name == Id(kCancelButton)) {
-    // Alt turns Cancel into Reset.
-    if ((message.modifiers & Tarsa::kModifier_Alt) != 0) {
+    if (resetMode_ || (message.modifiers & Tarsa::kModifier_Alt) != 0) {
       Reset();
     } else {
       Cancel();

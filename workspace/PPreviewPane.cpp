@@ -231,6 +231,12 @@ void PPreviewPane::MouseMoved(Tarsa::CMouseMessage& message) {
   }
 }
 
+void PPreviewPane::MouseEnter() {
+  // The picture takes the keys while the mouse is over it: Q, X and L act
+  // on what is under the mouse.
+  BecomeTarget(true);
+}
+
 void PPreviewPane::MouseDown(Tarsa::CMouseMessage& message) {
   // The hand: until the tools come, a press moves the picture.
   Tarsa::CMouseEvent event;

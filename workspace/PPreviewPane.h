@@ -50,6 +50,7 @@ class PPreviewPane : public Tarsa::CZoomPane, public PPreviewTarget {
   void Draw(Tarsa::CPort& port) override;
   void MouseDown(Tarsa::CMouseMessage& message) override;
   void MouseMoved(Tarsa::CMouseMessage& message) override;
+  void MouseEnter() override;
   void SizeChanged(std::int32_t dx, std::int32_t dy) override;
 
   // PPreviewTarget.

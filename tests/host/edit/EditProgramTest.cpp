@@ -150,18 +150,18 @@ class Edit : public ::testing::Test {
 
   // The window once it stopped changing (two grabs alike), kept as an
   // artefact.
-  std::unique_ptr<HostDocument> Settled(const std::string& artefact) {
+  // opening: the pane must show its picture fitted, as the workspace opens.
+  std::unique_ptr<HostDocument> Settled(const std::string& artefact, bool opening = false) {
     std::unique_ptr<HostDocument> last;
     const auto deadline = std::chrono::steady_clock::now() + kOpening;
     while (std::chrono::steady_clock::now() < deadline) {
-      std::this_thread::sleep_for(std::chrono::milliseconds(500));
+      std::this_thread::sleep_for(std::chrono::milliseconds(600));
       std::unique_ptr<HostDocument> shot = GrabWindow(std::stoul(window_));
       if (shot == nullptr) continue;
-      const bool same =
-          last != nullptr && last->Width() == shot->Width() && last->Height() == shot->Height() &&
-          std::equal(last->Plane8(0).begin(), last->Plane8(0).end(), shot->Plane8(0).begin()) &&
-          std::equal(last->Plane8(1).begin(), last->Plane8(1).end(), shot->Plane8(1).begin());
-      if (same) {
+      Rect pane, picture, shown;
+      // Until its first tiles the pane is grey: the window is still opening.
+      if (last != nullptr && !Differ(*last, *shot, {0, 0, shot->Width(), shot->Height()}) &&
+          (!opening || FindPicture(*shot, pane, picture, shown))) {
         ImageFile::Write(*shot, ArtefactPath(artefact), FileFormat::kPng);
         return shot;
       }
@@ -170,6 +170,32 @@ class Edit : public ::testing::Test {
     if (last != nullptr)
       ImageFile::Write(*last, ArtefactPath("unsettled-" + artefact), FileFormat::kPng);
     return last;
+  }
+
+  // The window once the area of it showed something other than before, and
+  // then stopped changing: input is taken in its own time on a loaded
+  // machine, and a solve shows nothing until the picture is drawn again.
+  std::unique_ptr<HostDocument> SettledAfterChange(const HostDocument& before, const Rect& area,
+                                                   const std::string& artefact) {
+    const auto deadline = std::chrono::steady_clock::now() + kOpening;
+    while (std::chrono::steady_clock::now() < deadline) {
+      std::unique_ptr<HostDocument> shot = GrabWindow(std::stoul(window_));
+      if (shot != nullptr && Differ(before, *shot, area)) break;
+      std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    }
+    return Settled(artefact);
+  }
+
+  static bool Differ(const HostDocument& a, const HostDocument& b, const Rect& area) {
+    if (a.Width() != b.Width() || a.Height() != b.Height()) return true;
+    for (int y = area.top; y < area.bottom; ++y) {
+      for (int x = area.left; x < area.right; ++x) {
+        const std::size_t at = std::size_t(y) * a.Width() + x;
+        for (int c = 0; c < 3; ++c)
+          if (a.Plane8(c)[at] != b.Plane8(c)[at]) return true;
+      }
+    }
+    return false;
   }
 
   // xdotool with the window focused first: there is no window manager.
@@ -292,6 +318,8 @@ constexpr int kFocalFieldFromRight = 68;
 constexpr int kFocalFieldTop = 241;
 constexpr int kModelPopupFromRight = 189;
 constexpr int kModelPopupTop = 172;
+constexpr int kCancelFromRight = 185;
+constexpr int kCancelTop = 54;
 
 double TitleZoom(const std::string& title) {
   const std::size_t at = title.find(" @ ");
@@ -301,7 +329,7 @@ double TitleZoom(const std::string& title) {
 TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
   Open({});
   ASSERT_FALSE(window_.empty()) << "no workspace window";
-  std::unique_ptr<HostDocument> shot = Settled("edit-opened.png");
+  std::unique_ptr<HostDocument> shot = Settled("edit-opened.png", true);
   ASSERT_NE(shot, nullptr);
   Rect pane, picture, shown;
   ASSERT_TRUE(FindPicture(*shot, pane, picture, shown))
@@ -330,7 +358,7 @@ TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
 TEST_F(Edit, ClosingTheWindowIsCancel) {
   Open({});
   ASSERT_FALSE(window_.empty());
-  ASSERT_NE(Settled("edit-closing.png"), nullptr);
+  ASSERT_NE(Settled("edit-closing.png", true), nullptr);
   ASSERT_TRUE(RequestClose(std::stoul(window_)));
   const Finished finished = End();
   EXPECT_EQ(finished.status, 0) << finished.errors;
@@ -340,7 +368,7 @@ TEST_F(Edit, ClosingTheWindowIsCancel) {
 TEST_F(Edit, OkWritesWhatTheStoredActionReplays) {
   Open({"--save-action", folder_.File("saved.action")});
   ASSERT_FALSE(window_.empty());
-  ASSERT_NE(Settled("edit-ok.png"), nullptr);
+  ASSERT_NE(Settled("edit-ok.png", true), nullptr);
   ASSERT_EQ(Xdo("key Return"), 0);
   const Finished finished = End();
   ASSERT_EQ(finished.status, 0) << finished.errors;
@@ -359,7 +387,7 @@ TEST_F(Edit, OkWritesWhatTheStoredActionReplays) {
 TEST_F(Edit, ConstraintsAreDrawnInTheirColoursWhereTheyLie) {
   Open({});
   ASSERT_FALSE(window_.empty());
-  ASSERT_NE(Settled("edit-constraints-result.png"), nullptr);
+  ASSERT_NE(Settled("edit-constraints-result.png", true), nullptr);
   // With Preview off the picture is the photograph, where each line's
   // traced curve runs from its first point to its last.
   ASSERT_EQ(Xdo("key p"), 0);
@@ -401,7 +429,7 @@ TEST_F(Edit, ConstraintsAreDrawnInTheirColoursWhereTheyLie) {
 TEST_F(Edit, ZoomScrollAndLoupeShowThePictureWhereExpected) {
   Open({});
   ASSERT_FALSE(window_.empty());
-  std::unique_ptr<HostDocument> opened = Settled("edit-zoom-fit.png");
+  std::unique_ptr<HostDocument> opened = Settled("edit-zoom-fit.png", true);
   ASSERT_NE(opened, nullptr);
   Rect pane, picture, shown;
   ASSERT_TRUE(FindPicture(*opened, pane, picture, shown));
@@ -470,18 +498,19 @@ TEST_F(Edit, ZoomScrollAndLoupeShowThePictureWhereExpected) {
 TEST_F(Edit, FocalLengthAndModelChangesSolveAgainAndRedraw) {
   Open({"--save-action", folder_.File("saved.action")});
   ASSERT_FALSE(window_.empty());
-  std::unique_ptr<HostDocument> opened = Settled("edit-focal-before.png");
+  std::unique_ptr<HostDocument> opened = Settled("edit-focal-before.png", true);
   ASSERT_NE(opened, nullptr);
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*opened, pane, picture, shown));
   const int right = opened->Width();
   ASSERT_EQ(Xdo("mousemove " + At(right - kFocalFieldFromRight, kFocalFieldTop) +
                 " click 1 key End BackSpace BackSpace BackSpace BackSpace BackSpace BackSpace "
                 "type 20"),
             0);
   ASSERT_EQ(Xdo("key Return"), 0);
-  std::unique_ptr<HostDocument> refocused = Settled("edit-focal-20.png");
+  std::unique_ptr<HostDocument> refocused =
+      SettledAfterChange(*opened, picture, "edit-focal-20.png");
   ASSERT_NE(refocused, nullptr);
-  Rect pane, picture, shown;
-  ASSERT_TRUE(FindPicture(*refocused, pane, picture, shown));
   EXPECT_LT(Agreement(*refocused, picture.left + 20, picture.top + 20, 150, *opened, 0, 0), 0.9)
       << "the preview did not change";
 
@@ -489,7 +518,8 @@ TEST_F(Edit, FocalLengthAndModelChangesSolveAgainAndRedraw) {
   ASSERT_EQ(Xdo("mousemove " + At(right - kModelPopupFromRight, kModelPopupTop) + " click 1"), 0);
   std::this_thread::sleep_for(std::chrono::milliseconds(300));
   ASSERT_EQ(Xdo("key Down Return"), 0);
-  std::unique_ptr<HostDocument> perspective = Settled("edit-perspective.png");
+  std::unique_ptr<HostDocument> perspective =
+      SettledAfterChange(*refocused, picture, "edit-perspective.png");
   ASSERT_NE(perspective, nullptr);
   EXPECT_LT(Agreement(*perspective, picture.left + 20, picture.top + 20, 150, *refocused, 0, 0),
             0.9)
@@ -514,6 +544,41 @@ TEST_F(Edit, FocalLengthAndModelChangesSolveAgainAndRedraw) {
   EXPECT_LT(DifferingShare(*perspective, picture, *ImageFile::Read(folder_.File("replayed.tif")),
                            "edit-perspective-applied-reduced.png"),
             0.05);
+}
+
+TEST_F(Edit, AltTurnsCancelIntoResetWhichStartsAgainFromThePhoto) {
+  Open({"--save-action", folder_.File("saved.action")});
+  ASSERT_FALSE(window_.empty());
+  std::unique_ptr<HostDocument> opened = Settled("edit-reset-before.png", true);
+  ASSERT_NE(opened, nullptr);
+  const int right = opened->Width();
+  const int cancelX = right - kCancelFromRight;
+  ASSERT_EQ(Xdo("mousemove " + At(cancelX, kCancelTop) + " keydown alt"), 0);
+  std::unique_ptr<HostDocument> held = Settled("edit-reset-alt.png");
+  ASSERT_NE(held, nullptr);
+  // The button's label changed while Alt is held.
+  EXPECT_LT(Agreement(*held, cancelX - 30, kCancelTop - 6, 12, *opened, 0, 0), 0.95);
+  ASSERT_EQ(Xdo("mousedown 1 sleep 0.2 mouseup 1 sleep 0.5 keyup alt"), 0);
+  std::unique_ptr<HostDocument> reset = Settled("edit-reset-after.png");
+  ASSERT_NE(reset, nullptr) << "Reset closed the workspace";
+  int status = 0;
+  EXPECT_FALSE(run_->Ended(status));
+  // Over the picture, which takes the keys from the button, Return is OK.
+  Rect pane, picture, shown;
+  ASSERT_TRUE(FindPicture(*reset, pane, picture, shown));
+  ASSERT_EQ(Xdo("mousemove " + At((pane.left + pane.right) / 2, (pane.top + pane.bottom) / 2) +
+                " sleep 0.3 key Return"),
+            0);
+  const Finished finished = End();
+  ASSERT_EQ(finished.status, 0) << finished.errors;
+  ASSERT_EQ(finished.errors, "");
+  // Reset takes the photo's own 10 mm and drops the action's constraints.
+  const Descriptor saved = ActionFile::Read(folder_.File("saved.action"));
+  ASSERT_NE(saved.Find(FourCC("focL")), nullptr);
+  EXPECT_NEAR(saved.Find(FourCC("focL"))->number, 10.0 * kPhotoWidth / 36.0, 0.5);
+  const Descriptor::Item* blob = saved.Find(FourCC("cnsD"));
+  EXPECT_TRUE(blob == nullptr ||
+              Project::ConstraintBlob::Decode(blob->data.data(), blob->data.size()).empty());
 }
 
 #endif  // ARCHWAY_REAL_MODULE
