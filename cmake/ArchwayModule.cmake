@@ -103,6 +103,6 @@ function(archway_test)
     gtest_discover_tests(${target} TEST_PREFIX "${prefix}${A_NAME}."
                          DISCOVERY_TIMEOUT 60
                          PROPERTIES ENVIRONMENT
-                         "ASAN_OPTIONS=detect_leaks=1:abort_on_error=1;UBSAN_OPTIONS=print_stacktrace=1")
+                         "ASAN_OPTIONS=detect_leaks=1:abort_on_error=1;UBSAN_OPTIONS=print_stacktrace=1;LSAN_OPTIONS=suppressions=${PROJECT_SOURCE_DIR}/tests/lsan.supp")
   endforeach()
 endfunction()

@@ -141,11 +141,13 @@ TEST_F(FilterRun, PreferencesStartFromDefaultsWhileCtrlAltShiftAreHeld) {
   }
 }
 
-// The run as far as this build goes: through the host, GPU and OpenGL checks,
+// The run with no display: through the host, GPU and OpenGL checks,
 // preferences and settings and the solver's preparation (a real solve), to
-// the workspace, which throws. Needs a working OpenGL environment (a GPU or Mesa's software
-// renderer); without one the run is refused at the OpenGL check instead.
+// the workspace, which cannot open its window and throws. Needs a working
+// OpenGL environment (a GPU or Mesa's software renderer); without one the
+// run is refused at the OpenGL check instead.
 TEST_F(FilterRun, InteractiveRunGoesUpToTheWorkspaceAndCleansUp) {
+  Tarsa::testing::ScopedEnvironment noDisplay("DISPLAY", nullptr);
   static int prepared = 0;
   prepared = 0;
   const Tarsa::HostLensProfilesSuite lens{nullptr, nullptr, [] {
@@ -163,7 +165,7 @@ TEST_F(FilterRun, InteractiveRunGoesUpToTheWorkspaceAndCleansUp) {
   if (shown.texts[0].find("OpenGL") != std::string::npos) {
     GTEST_SKIP() << "no OpenGL here: " << shown.texts[0];
   }
-  EXPECT_EQ(shown.texts[0], "This build of Archway cannot open its workspace yet.");
+  EXPECT_EQ(shown.texts[0], "The display cannot be opened.");
   EXPECT_EQ(host.propertyWrites.front(), std::make_pair(FourCC("wtch"), std::intptr_t(1)));
   EXPECT_EQ(host.Record()->flagByte94, 0);
   // Auto was forced, so the lens profiles were asked: the suite was taken,
