@@ -355,6 +355,18 @@ TEST_F(Edit, OpensWithThePreviewOfTheActionAndEscapeWritesNothing) {
   EXPECT_EQ(folder_.Listing().find("edited"), std::string::npos);
 }
 
+TEST_F(Edit, CancelWritesNothing) {
+  Open({"--save-action", folder_.File("saved.action")});
+  ASSERT_FALSE(window_.empty());
+  std::unique_ptr<HostDocument> opened = Settled("edit-cancel.png", true);
+  ASSERT_NE(opened, nullptr);
+  ASSERT_EQ(Xdo("mousemove " + At(opened->Width() - kCancelFromRight, kCancelTop) + " click 1"), 0);
+  const Finished finished = End();
+  EXPECT_EQ(finished.status, 0) << finished.errors;
+  EXPECT_EQ(folder_.Listing().find("edited"), std::string::npos);
+  EXPECT_EQ(folder_.Listing().find("saved.action"), std::string::npos);
+}
+
 TEST_F(Edit, ClosingTheWindowIsCancel) {
   Open({});
   ASSERT_FALSE(window_.empty());
