@@ -101,9 +101,7 @@ class LineSolve : public IterativeWarpSolver {
   const LineSolveWeights weights_;
   std::vector<std::vector<Point2f>> lastLineEnds_;
   std::vector<std::vector<Point2f>> lastPlaneEnds_;
-  // The offset form factors faster but leaned an edge of the generated
-  // room by half a degree (the sample's test holds them within 0.1).
-  LineForm lineForm_ = LineForm::kFromFirstSample;
+  LineForm lineForm_ = LineForm::kOffset;
   // The offset form's first offset unknown, after the angles and the
   // polygons' homographies; as of the last PrepareGaussNewton.
   std::int32_t firstOffset_ = 0;

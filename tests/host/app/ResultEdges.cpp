@@ -131,14 +131,21 @@ std::optional<Point2> FindEdge(const HostDocument& image, Point2 at, Point2 norm
   const auto peak = std::max_element(rise.begin(), rise.end());
   if (*peak < 0.5 * size) return std::nullopt;
   const auto k = std::distance(rise.begin(), peak);
-  double offset = 0;
-  // A parabola through the peak and its neighbours; the ends stay whole.
-  if (k > 0 && k + 1 < std::ssize(rise)) {
-    const double left = rise[size_t(k - 1)], right = rise[size_t(k + 1)];
-    const double curvature = left - 2 * *peak + right;
-    if (curvature < 0) offset = 0.5 * (left - right) / curvature;
+  // The rise between bilinear samples is piecewise linear with its corners
+  // a pixel apart, so its peak sits on a corner or is flat between two: an
+  // edge on a pixel centre gives a plateau a pixel wide, and the peak alone
+  // snaps to either end of it. The rise's centroid over two pixels each way
+  // covers both corners either side of the edge and finds it wherever it
+  // falls within a pixel.
+  constexpr std::ptrdiff_t kHalfWindow = 8;  // quarter pixels
+  double weight = 0, moment = 0;
+  for (std::ptrdiff_t m = std::max<std::ptrdiff_t>(0, k - kHalfWindow);
+       m <= std::min<std::ptrdiff_t>(std::ssize(rise) - 1, k + kHalfWindow); ++m) {
+    const double w = std::max(0.0, rise[size_t(m)]);
+    weight += w;
+    moment += w * double(m - count);
   }
-  const double t = (double(k - count) + offset) * kSpacing;
+  const double t = moment / weight * kSpacing;
   return Point2{at.x + t * normal.x, at.y + t * normal.y};
 }
 

@@ -45,10 +45,11 @@ class ResultMap {
   std::optional<Point2> last_;
 };
 
-// The edge across a profile through `at` along the unit `normal`: the
+// The edge across a profile through `at` along the unit `normal`: about the
 // strongest rise in the direction of `step` (the colour across the edge,
-// far side less near side) within `reach` pixels, to a fraction of a pixel.
-// Nothing when no rise reaches half of the step's size.
+// far side less near side) within `reach` pixels, the centroid of that rise,
+// to a hundredth of a pixel wherever the edge falls within a pixel. Nothing
+// when no rise reaches half of the step's size.
 std::optional<Point2> FindEdge(const HostDocument& image, Point2 at, Point2 normal,
                                const Colour& step, double reach);
 
