@@ -135,7 +135,7 @@ void CView::ScrollTo(CPoint where) {
   imageRight_ = x + size.width;
   imageBottom_ = y + size.height;
   Invalidate();
-  Scrolled();
+  OnScrolled();
 }
 
 void CView::ScrollBy(std::int32_t dx, std::int32_t dy) {

@@ -72,7 +72,7 @@ class CView : public virtual CMessenger {
   // and after ScrollTo moved the image: a scrolled view keeps what depends
   // on its visible part up to date here.
   virtual void SizeChanged(std::int32_t /*dx*/, std::int32_t /*dy*/) {}
-  virtual void Scrolled() {}
+  virtual void OnScrolled() {}
 
   CPoint LocalToWindow(CPoint p) const;
   CPoint WindowToLocal(CPoint p) const;

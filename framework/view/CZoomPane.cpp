@@ -178,7 +178,7 @@ void CZoomPane::SizeChanged(std::int32_t /*dx*/, std::int32_t /*dy*/) {
   Announce(ScrollChangedName());
 }
 
-void CZoomPane::Scrolled() {
+void CZoomPane::OnScrolled() {
   if (adjusting_) return;
   ScrollChanged();
   Announce(ScrollChangedName());

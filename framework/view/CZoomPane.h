@@ -100,7 +100,7 @@ class CZoomPane : public CPane {
 
   void MouseWheel(CMouseMessage& message) override;
   void SizeChanged(std::int32_t dx, std::int32_t dy) override;
-  void Scrolled() override;
+  void OnScrolled() override;
 
  protected:
   // The hooks; both redraw the pane unless a subclass does otherwise.
