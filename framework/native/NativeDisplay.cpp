@@ -37,6 +37,9 @@ bool StartWindowSystem() {
   // context of its own on the same thread, which would leave SDL's current
   // context elsewhere and the windows black.
   SDL_SetHint(SDL_HINT_FRAMEBUFFER_ACCELERATION, "0");
+  // Closing a dialog's window is that dialog's Cancel, not the end of the
+  // program: the host decides when it quits.
+  SDL_SetHint(SDL_HINT_QUIT_ON_LAST_WINDOW_CLOSE, "0");
   if (SDL_InitSubSystem(SDL_INIT_VIDEO) != 0) return false;
   if (std::getenv("DISPLAY") != nullptr) XSetErrorHandler(IgnoreXError);
   gVideoStarted = true;

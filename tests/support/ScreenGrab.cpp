@@ -71,6 +71,7 @@ std::unique_ptr<HostDocument> GrabWindowPng(unsigned long window, const std::str
 bool RequestClose(unsigned long window) {
   Display* display = XOpenDisplay(nullptr);
   if (display == nullptr) return false;
+  XSetErrorHandler(IgnoreError);
   XEvent event{};
   event.xclient.type = ClientMessage;
   event.xclient.window = Window(window);
