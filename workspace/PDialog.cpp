@@ -227,9 +227,8 @@ void PDialog::FullRebuild() {
 }
 
 void PDialog::Redraw() {
+  // The hub's rebuild makes the preview's tiles stale with the results.
   if (filter_.HasImageHub()) filter_.ImageHub().RebuildResults();
-  if (filter_.HasImageHub() && filter_.ImageHub().HasPreview())
-    filter_.ImageHub().Preview().InvalidateAll();
   Invalidate();
 }
 
